@@ -1,0 +1,44 @@
+// One job per Maintenance command keyword. Each logs its messages, pauses
+// where its keyword does, makes its calls in order and returns its result.
+#pragma once
+
+int JobNUpdate();
+int JobNEndUpdate();
+int JobNEndUpdateFail();
+int JobCopyFilesToNotes();
+int JobCopyFilesToSametime();
+int JobDelNIFiles();
+int JobDelOldNIFiles();
+int JobDelSametimeFiles();
+int JobEnableSametime8Config();
+int JobDisableSametime8Config();
+int JobIsSametime8Enable();
+int JobEnableSametime7Config();
+int JobDisableSametime7Config();
+int JobEnableSTEmbedded();
+int JobDisableSTEmbedded();
+int JobIsEmbedST8Enable();
+int JobDelSametimeStampFile();
+int JobDelSametimeFilesReboot();
+int JobSmsInstallSametimeEx();
+int JobSmsInstallSmartTag();
+int JobSmsUninstallSmartTag();
+int JobUninstallOldOINI();
+int JobUninstallOldOI();
+int JobUninstallOldNI();
+int JobSmsDelOldNICurUserKey();
+int JobSmsDelOldOICurUserKey();
+int JobClearOldRMenuReg();
+int JobDelAllQMFiles();
+int JobDelUpdTemp();
+int JobDelSametimeFilesEx();
+int JobMocVistaInstall();
+int JobClearCurUserQMReg();
+int JobSmsClearOldOIReg();
+int JobDeleteRegFeatureControl();
+int JobSmsRefreshSysEnv();
+int JobUpdateShortcuts();
+int JobAddShortcuts();
+int JobDelUnusedData();
+int JobDelShortcuts();
+int JobModifyAdminMsiDisplayVersion();

@@ -1,0 +1,41 @@
+#!/usr/bin/env bash
+# Scratch Wine prefixes for the tests.
+#   prefix.sh template DIR          create DIR once (null display driver)
+#   prefix.sh clone TEMPLATE DIR    a fresh copy of TEMPLATE at DIR
+#   prefix.sh remove DIR            stop its wineserver and delete it
+# A clone hard-links the large system libraries of the template (Wine never
+# writes them) and copies everything a test or Wine may change.
+set -euo pipefail
+export WINEDEBUG=-all WINEDLLOVERRIDES="mscoree,mshtml="
+
+command=${1:?usage}; shift
+case "$command" in
+  template)
+    dir=$1
+    if [ -f "$dir/.qm-template-ready" ]; then exit 0; fi
+    rm -rf "$dir"; mkdir -p "$(dirname "$dir")"
+    WINEPREFIX="$dir" wineboot --init >/dev/null 2>&1
+    WINEPREFIX="$dir" wine reg add 'HKCU\Software\Wine\Drivers' /v Graphics /d null /f >/dev/null 2>&1
+    WINEPREFIX="$dir" wineserver -w
+    touch "$dir/.qm-template-ready"
+    ;;
+  clone)
+    template=$1; dir=$2
+    [ -f "$template/.qm-template-ready" ] || { echo "no template at $template" >&2; exit 1; }
+    if [ -d "$dir" ]; then WINEPREFIX="$dir" wineserver -k 2>/dev/null || true; rm -rf "$dir"; fi
+    cp -al "$template" "$dir"
+    # Real copies of everything but the system folders' libraries.
+    find "$dir" -type f ! -path '*/drive_c/windows/system32/*' \
+        ! -path '*/drive_c/windows/syswow64/*' ! -path '*/drive_c/windows/winsxs/*' \
+        -exec sh -c 'for f; do cp -p --remove-destination "$f" "$f.qmcopy" && mv -f "$f.qmcopy" "$f"; done' _ {} +
+    rm -f "$dir/.qm-template-ready"
+    ;;
+  remove)
+    dir=$1
+    if [ -d "$dir" ]; then
+      WINEPREFIX="$dir" wineserver -k 2>/dev/null || true
+      rm -rf "$dir"
+    fi
+    ;;
+  *) echo "unknown command $command" >&2; exit 2 ;;
+esac
