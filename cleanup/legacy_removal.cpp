@@ -6,6 +6,5 @@ void UninstallSmartTag() {}
 void ClearOldRMenuReg() {}
 void RemoveOldOIInstallFiles() {}
 void RemoveOldOIRegistry(HKEY) {}
-void RemoveUpdTempFolder() {}
 void UnRegisterOldClassIDs() {}
 void RegQM64BitAddin() {}
