@@ -50,7 +50,7 @@ struct ProgramOptions {
 };
 
 class ProgramUnderTest {
-  public:
+public:
     // Copies the program and stand-ins into folder (created when missing).
     ProgramUnderTest(const std::wstring& folder, const ProgramOptions& options = {});
 
@@ -68,7 +68,7 @@ class ProgramUnderTest {
     // Runs with exactly this command line (program name included).
     RunResult RunRaw(const std::wstring& commandLine, DWORD timeoutMs = 60000);
 
-  private:
+private:
     std::wstring m_folder;
     std::wstring m_exePath;
     std::map<std::wstring, std::wstring> m_env;

@@ -3,7 +3,7 @@
 namespace {
 
 class Key {
-  public:
+public:
     Key(HKEY root, const std::wstring& path, REGSAM access, bool create) {
         LONG rc = create ? RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, access, nullptr,
                                            &m_key, nullptr)
@@ -19,7 +19,7 @@ class Key {
     }
     HKEY get() const { return m_key; }
 
-  private:
+private:
     HKEY m_key = nullptr;
 };
 

@@ -30,13 +30,13 @@ void RegRemoveValue(HKEY root, const std::wstring& key, const wchar_t* name, REG
 
 // Saves one value at construction and puts it back (or removes it) at the end.
 class RegValueGuard {
-  public:
+public:
     RegValueGuard(HKEY root, std::wstring key, std::wstring name, REGSAM view = 0);
     ~RegValueGuard();
     RegValueGuard(const RegValueGuard&) = delete;
     RegValueGuard& operator=(const RegValueGuard&) = delete;
 
-  private:
+private:
     HKEY m_root;
     std::wstring m_key;
     std::wstring m_name;

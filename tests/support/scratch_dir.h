@@ -5,7 +5,7 @@
 #include <string>
 
 class ScratchDir {
-  public:
+public:
     explicit ScratchDir(const wchar_t* tag = L"t");
     ~ScratchDir();
     ScratchDir(const ScratchDir&) = delete;
@@ -15,6 +15,6 @@ class ScratchDir {
     // path\rel, with the folder created when makeDir is true.
     std::wstring Sub(const std::wstring& rel, bool makeDir = false) const;
 
-  private:
+private:
     std::wstring m_path;
 };
