@@ -11,6 +11,7 @@
 #include "tests/support/file_util.h"
 #include "tests/support/program_run.h"
 #include "tests/support/scratch_dir.h"
+#include "tests/support/test_paths.h"
 
 namespace {
 
@@ -265,6 +266,44 @@ TEST_F(EntryTest, StrayCharactersInKeywordCommandsAreHandled) {
         ExpectCleanExit(run, 0);
         ASSERT_EQ(1u, run.traces.size()) << Narrow(line);
     }
+}
+
+}  // namespace
+
+namespace {
+
+std::string ManifestOf(const std::wstring& exe) {
+    HMODULE module = LoadLibraryExW(exe.c_str(), nullptr, LOAD_LIBRARY_AS_DATAFILE);
+    if (module == nullptr) {
+        return std::string();
+    }
+    std::string text;
+    HRSRC found = FindResourceW(module, MAKEINTRESOURCEW(1), MAKEINTRESOURCEW(24));
+    if (found != nullptr) {
+        const char* data = static_cast<const char*>(LockResource(LoadResource(module, found)));
+        text.assign(data, SizeofResource(module, found));
+    }
+    FreeLibrary(module);
+    return text;
+}
+
+TEST(ProgramImage, CarriesItsManifestAndVersion) {
+    std::wstring exe = BuiltProgramPath();
+    std::string manifest = ManifestOf(exe);
+    EXPECT_NE(std::string::npos, manifest.find("level=\"asInvoker\""));
+    EXPECT_NE(std::string::npos, manifest.find("{35138b9a-5d96-4fbd-8e2d-a2440225f93a}"));  // 7
+    EXPECT_NE(std::string::npos, manifest.find("{8e0f7a12-bfb3-4fe8-b9a5-48fd50a15a9a}"));  // 10
+
+    DWORD ignored = 0;
+    DWORD size = GetFileVersionInfoSizeW(exe.c_str(), &ignored);
+    ASSERT_GT(size, 0u);
+    std::vector<BYTE> info(size);
+    ASSERT_TRUE(GetFileVersionInfoW(exe.c_str(), 0, size, info.data()));
+    wchar_t* name = nullptr;
+    UINT length = 0;
+    ASSERT_TRUE(VerQueryValueW(info.data(), L"\\StringFileInfo\\040904B0\\OriginalFilename",
+                               reinterpret_cast<void**>(&name), &length));
+    EXPECT_STREQ(L"qmMrvONI.exe", name);
 }
 
 }  // namespace

@@ -1,0 +1,57 @@
+// Runs qmMrvONI.exe for the demo and prints what it did: the command line,
+// each trace record it wrote (level and text) and its exit code.
+//   demo_runner.exe <program folder> <arguments>...
+// Each further argument is one command line after the program name.
+#include <windows.h>
+
+#include <cstdio>
+#include <string>
+
+#include "tests/support/file_util.h"
+#include "tests/support/program_run.h"
+
+namespace {
+
+void PrintRecordText(const std::string& text) {
+    std::string shown;
+    for (char ch : text) {
+        if (ch == '\n') {
+            shown += "\\n";
+        } else if (ch == '\r') {
+            shown += "\\r";
+        } else {
+            shown += ch;
+        }
+    }
+    printf("%s", shown.c_str());
+}
+
+}  // namespace
+
+int wmain(int argc, wchar_t** argv) {
+    if (argc < 3) {
+        fprintf(stderr, "usage: demo_runner <program folder> <arguments>...\n");
+        return 2;
+    }
+    std::wstring folder = argv[1];
+    std::wstring program = JoinPath(folder, L"qmMrvONI.exe");
+    std::wstring traceLog = JoinPath(folder, L"demo-trace.log");
+    for (int i = 2; i < argc; ++i) {
+        std::wstring arguments = argv[i];
+        printf("\n$ qmMrvONI.exe %s\n", Narrow(arguments).c_str());
+        DeleteFileW(traceLog.c_str());
+        RunResult run;
+        RunAsDebuggee(L"\"" + program + L"\" " + arguments,
+                      BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", traceLog}}), folder, 120000,
+                      &run);
+        for (const TraceRecord& record : ParseTraceLog(ReadFileBytes(traceLog))) {
+            printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
+            PrintRecordText(record.text);
+            printf("\n");
+        }
+        printf("  exit code: %d\n", run.exitCode);
+        fflush(stdout);
+    }
+    DeleteFileW(traceLog.c_str());
+    return 0;
+}
