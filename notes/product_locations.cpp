@@ -1,49 +1,32 @@
+// The suite's own install folder, as the Notes and Sametime code finds it.
 #include "notes/product_locations.h"
 
-// Filled in with the product location lookups.
-bool GetQMInstallPath(wchar_t*, DWORD) {
-    return false;
-}
-bool GetQMInstallPathFromReg(HKEY, wchar_t*, DWORD) {
-    return false;
-}
-bool GetNotesPath(wchar_t*, DWORD) {
-    return false;
-}
-DWORD GetNotesVersion() {
-    return 6;
-}
-bool GetNIPath(wchar_t*, DWORD) {
-    return false;
-}
-bool GetNIPathAnyUser(wchar_t*, DWORD) {
-    return false;
-}
-bool GetNotesMultiUser(DWORD*) {
-    return false;
-}
-bool IsCitrixServer() {
-    return false;
-}
-bool GetEmbeddedSTPath(wchar_t*, DWORD, DWORD*) {
-    return false;
-}
-bool GetEmbeddedSTDataPath(wchar_t*, DWORD, DWORD*) {
-    return false;
-}
-bool GetSametimePath(wchar_t*, DWORD, DWORD*) {
-    return false;
-}
-bool GetSametimeConfigPath(int, CStringEx&) {
-    return false;
-}
-bool GetAppDataMrvQMPath(const wchar_t*, CStringEx&) {
-    return false;
+#include "base/trace.h"
+#include "notes/location_values.h"
+
+namespace {
+
+const wchar_t kSuiteKey[] = L"SOFTWARE\\Mirovan\\QmkTools";
+const wchar_t kSuitePathValue[] = L"Path";
+
+}  // namespace
+
+bool GetQMInstallPathFromReg(HKEY root, wchar_t* lpszPath, DWORD capacity) {
+    if (lpszPath == nullptr) {
+        TraceLevel8(TraceValue("GetQMInstallPathFromReg: Input Para is NULL!"));
+        return false;
+    }
+    return ReadFittingValue(root, kSuiteKey, kSuitePathValue, KEY_QUERY_VALUE, lpszPath, capacity);
 }
 
-#include "base/path_api.h"
-
-bool CPathApi::GetQMRootPath(CStringEx& out) {
-    out.Empty();
-    return true;
+bool GetQMInstallPath(wchar_t* lpszPath, DWORD capacity) {
+    if (lpszPath == nullptr) {
+        TraceLevel8(TraceValue("GetQMInstallPath: Input Para is NULL!"));
+        return false;
+    }
+    if (GetQMInstallPathFromReg(HKEY_LOCAL_MACHINE, lpszPath, capacity)) {
+        return true;
+    }
+    TraceLevel8(TraceValue("Can not find PATH!"));
+    return GetQMInstallPathFromReg(HKEY_CURRENT_USER, lpszPath, capacity);
 }

@@ -1,0 +1,19 @@
+// Paths of the plug-in files: joining a folder and a file name without ever
+// cutting the result short, and the test that a folder may be worked in.
+#pragma once
+
+#include <windows.h>
+
+// out = folder, one backslash, relative. Fails with out empty when folder is
+// missing or empty, when relative is empty, rooted, holds a drive colon or a
+// ".." step (so the result never leaves folder), or when the result would not
+// fit MAX_PATH characters with its terminator.
+bool JoinFilePath(const wchar_t* folder, const wchar_t* relative, wchar_t (&out)[MAX_PATH]);
+
+// True for an existing folder named by a full path ("X:\..." or "\\server\share...")
+// shorter than MAX_PATH. An empty or relative path names the current folder or
+// a drive root by accident, so it never qualifies.
+bool IsUsableFolder(const wchar_t* folder);
+
+// True when path names an existing file (not a folder).
+bool IsRegularFile(const wchar_t* path);
