@@ -11,11 +11,11 @@ std::string WideToAnsi(const wchar_t* text);
 
 // Owner of the narrow strings that AnsiCopyToList hands out.
 class AnsiStringList {
-  public:
+public:
     char* Add(std::unique_ptr<char[]> text);
     size_t size() const { return m_entries.size(); }
 
-  private:
+private:
     std::vector<std::unique_ptr<char[]>> m_entries;
 };
 

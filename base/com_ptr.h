@@ -10,7 +10,7 @@
 
 template <typename T>
 class ComPtr {
-  public:
+public:
     ComPtr() noexcept = default;
     ComPtr(const ComPtr& other) noexcept : m_ptr(other.m_ptr) { AddRef(); }
     ComPtr(ComPtr&& other) noexcept : m_ptr(other.m_ptr) { other.m_ptr = nullptr; }
@@ -54,7 +54,7 @@ class ComPtr {
         return m_ptr->QueryInterface(__uuidof(U), out->put_void());
     }
 
-  private:
+private:
     void AddRef() noexcept {
         if (m_ptr) {
             m_ptr->AddRef();
@@ -90,7 +90,7 @@ using UniqueCoTaskMem = UniqueResource<NullIsNoneTraits<void*, com_free::TaskMem
 
 // Owns a VARIANT and clears it on every path.
 class UniqueVariant {
-  public:
+public:
     UniqueVariant() noexcept { ::VariantInit(&m_var); }
     ~UniqueVariant() { ::VariantClear(&m_var); }
     UniqueVariant(const UniqueVariant&) = delete;
@@ -99,6 +99,6 @@ class UniqueVariant {
     VARIANT* get() noexcept { return &m_var; }
     const VARIANT& ref() const noexcept { return m_var; }
 
-  private:
+private:
     VARIANT m_var;
 };

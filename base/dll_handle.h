@@ -4,7 +4,7 @@
 #include <windows.h>
 
 class CDLLHandle {
-  public:
+public:
     CDLLHandle(HMODULE module, BOOL owns) : m_module(module), m_owns(owns) {}
     virtual ~CDLLHandle() {
         if (m_owns && m_module != nullptr) {
@@ -16,7 +16,7 @@ class CDLLHandle {
 
     HMODULE Handle() const { return m_module; }
 
-  private:
+private:
     HMODULE m_module;
     BOOL m_owns;
 };

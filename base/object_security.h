@@ -6,10 +6,16 @@
 #include <aclapi.h>
 
 class CObjectSecurity {
-  public:
-    // For a file (path copied, at most 256 characters).
+public:
+    // Names of at most 256 characters are checked; a longer one is refused
+    // (no descriptor, GetLastError() gives ERROR_FILENAME_EXCED_RANGE) rather
+    // than cut, which would check another object. A null name, or a root
+    // other than the four named, gives ERROR_INVALID_PARAMETER.
+    //
+    // For a file (path copied).
     explicit CObjectSecurity(const wchar_t* filePath);
-    // For a registry key: root and subkey.
+    // For a registry key: HKEY_CLASSES_ROOT, HKEY_CURRENT_USER,
+    // HKEY_LOCAL_MACHINE or HKEY_USERS and a subkey ("USERS\<subkey>").
     CObjectSecurity(HKEY root, const wchar_t* subkey);
     virtual ~CObjectSecurity();
     CObjectSecurity(const CObjectSecurity&) = delete;
@@ -22,7 +28,7 @@ class CObjectSecurity {
     // The result of the last GetNamedSecurityInfoW.
     DWORD GetLastError() const { return m_lastError; }
 
-  private:
+private:
     void Load();
 
     PSECURITY_DESCRIPTOR m_descriptor = nullptr;

@@ -7,7 +7,7 @@
 #include "base/string_ex.h"
 
 class COIXML {
-  public:
+public:
     COIXML();
     virtual ~COIXML();
     COIXML(const COIXML&) = delete;
@@ -36,7 +36,7 @@ class COIXML {
     int GetChildCount() const { return m_childCount; }
     const COIXML* GetChild(int index) const;
 
-  private:
+private:
     // Reads the last element of `text` into this element and cuts it out of
     // `text`: -2 too short, -1 malformed, 0 leaf, 1 element with children.
     int ParseNode(CStringEx& text, int depth);

@@ -7,7 +7,7 @@
 #include "base/string_ex.h"
 
 class CPathApi {
-  public:
+public:
     // out = folder of `module`'s executable file joined with fileName.
     static void GetResFilePath(HMODULE module, const wchar_t* fileName, CStringEx& out);
     // Removes the last path element in place; an empty path stays empty.

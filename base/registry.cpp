@@ -19,7 +19,7 @@ HKEY RedirectedRoot(HKEY root) {
 UniqueHKey OpenKey(HKEY root, const wchar_t* subkey, REGSAM access) {
     UniqueHKey key;
     if (RegOpenKeyExW(root, subkey, 0, access, key.put()) != ERROR_SUCCESS) {
-        key.reset();
+        key.release();  // nothing was opened
     }
     return key;
 }
@@ -31,6 +31,17 @@ bool QueryValueInfo(HKEY root, const wchar_t* subkey, const wchar_t* name, REGSA
     }
     UniqueHKey key = OpenKey(RedirectedRoot(root), subkey, KEY_READ | view);
     return key && RegQueryValueExW(key.get(), name, nullptr, type, nullptr, size) == ERROR_SUCCESS;
+}
+
+// A REG_SZ may be stored without its terminator: the text read must still
+// end inside the buffer (which was zeroed before the read).
+bool TerminateText(wchar_t* buffer, DWORD sizeChars, DWORD bytesRead) {
+    DWORD chars = bytesRead / sizeof(wchar_t);
+    if (chars < sizeChars) {
+        buffer[chars] = L'\0';
+        return true;
+    }
+    return buffer[sizeChars - 1] == L'\0';
 }
 
 // Opens for writing, or creates the key in the same view.
@@ -49,7 +60,7 @@ UniqueHKey CreateRegKey(HKEY root, const wchar_t* subkey, REGSAM view) {
     if (root == nullptr || subkey == nullptr ||
         RegCreateKeyExW(root, subkey, 0, nullptr, REG_OPTION_NON_VOLATILE, KEY_ALL_ACCESS | view,
                         nullptr, key.put(), nullptr) != ERROR_SUCCESS) {
-        key.reset();
+        key.release();  // nothing was opened
     }
     return key;
 }
@@ -103,16 +114,14 @@ BOOL GetRegString(HKEY root, const wchar_t* subkey, const wchar_t* name, wchar_t
     }
     UniqueHKey key = OpenKey(RedirectedRoot(root), subkey, KEY_READ | view);
     DWORD type = 0;
-    // One character stays free so the text is always terminated.
-    DWORD size = (sizeChars - 1) * sizeof(wchar_t);
+    DWORD size = sizeChars * sizeof(wchar_t);
     if (!key ||
         RegQueryValueExW(key.get(), name, nullptr, &type, reinterpret_cast<BYTE*>(buffer), &size) !=
             ERROR_SUCCESS ||
-        type != REG_SZ) {
+        type != REG_SZ || !TerminateText(buffer, sizeChars, size)) {
         ZeroMemory(buffer, sizeChars * sizeof(wchar_t));
         return FALSE;
     }
-    buffer[sizeChars - 1] = L'\0';
     return TRUE;
 }
 
@@ -181,15 +190,23 @@ BOOL EnumRegValueNames(HKEY root, const wchar_t* subkey, std::vector<CStringEx>&
                          nullptr, nullptr, nullptr, nullptr) != ERROR_SUCCESS) {
         return FALSE;
     }
+    // Value names may be far longer than key names; one that does not fit
+    // the buffer is left out and the result says the list is incomplete.
     const DWORD kNameChars = 2048;
-    wchar_t name[kNameChars];
-    LONG last = ERROR_SUCCESS;
+    std::vector<wchar_t> name(kNameChars);
+    BOOL complete = TRUE;
     for (DWORD i = 0; i < count; ++i) {
         DWORD size = kNameChars;
-        last = RegEnumValueW(key.get(), i, name, &size, nullptr, nullptr, nullptr, nullptr);
-        if (last == ERROR_SUCCESS) {
-            names.emplace_back(name);
+        LONG step =
+            RegEnumValueW(key.get(), i, name.data(), &size, nullptr, nullptr, nullptr, nullptr);
+        if (step == ERROR_NO_MORE_ITEMS) {
+            break;  // values removed meanwhile: the list ends early
+        }
+        if (step == ERROR_SUCCESS) {
+            names.emplace_back(name.data());
+        } else {
+            complete = FALSE;
         }
     }
-    return last == ERROR_SUCCESS;
+    return complete;
 }

@@ -41,6 +41,8 @@ BOOL SetRegString(HKEY root, const wchar_t* subkey, const wchar_t* name, const w
 BOOL SetRegDWORD(HKEY root, const wchar_t* subkey, const wchar_t* name, DWORD value, REGSAM view);
 // Deletes one value. Not redirected.
 BOOL DeleteRegValue(HKEY root, const wchar_t* subkey, const wchar_t* name, REGSAM view);
-// The value names of root\subkey, appended to names. Not redirected.
+// The value names of root\subkey, appended to names; 0 when a name could not
+// be read (longer than 2047 characters): the others are listed all the same.
+// Not redirected.
 BOOL EnumRegValueNames(HKEY root, const wchar_t* subkey, std::vector<CStringEx>& names,
                        REGSAM view);

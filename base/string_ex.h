@@ -6,7 +6,7 @@
 #include <windows.h>
 
 class CStringEx {
-  public:
+public:
     CStringEx() noexcept = default;
     CStringEx(const wchar_t* text);  // NOLINT: implicit by design, like a string literal
     CStringEx(const wchar_t* text, int length);
@@ -74,7 +74,7 @@ class CStringEx {
     // Joins `file` to `path` with exactly one backslash.
     static void PathAppend(CStringEx& path, const wchar_t* file);
 
-  private:
+private:
     // Replaces the text with `length` characters from `text` (which may point
     // into the current buffer).
     void Assign(const wchar_t* text, int length);

@@ -59,7 +59,7 @@ void TraceLevel2Named(const char* prefix, const Params&... params) {
 
 // Entry and exit records of a scope: "--> name ..." now, "<-- name" at the end.
 class CAutoFunTrace {
-  public:
+public:
     template <typename... Params>
     explicit CAutoFunTrace(const char* functionName, const Params&... params)
         : m_name(functionName ? functionName : "") {
@@ -70,7 +70,7 @@ class CAutoFunTrace {
     CAutoFunTrace(const CAutoFunTrace&) = delete;
     CAutoFunTrace& operator=(const CAutoFunTrace&) = delete;
 
-  private:
+private:
     std::string m_name;
 };
 
@@ -84,7 +84,7 @@ void UninitMRVTRACER();
 // The program holds one static instance: the trace library is loaded before
 // the entry point runs and released after it returns.
 class MIROVANLOGInitialize {
-  public:
+public:
     MIROVANLOGInitialize();
     ~MIROVANLOGInitialize();
     MIROVANLOGInitialize(const MIROVANLOGInitialize&) = delete;

@@ -9,7 +9,7 @@ class CStringEx;
 
 // The text form of one traced value, held as a narrow string.
 class CVarAdapter {
-  public:
+public:
     CVarAdapter(const char* text);
     CVarAdapter(const std::string& text);
     CVarAdapter(const wchar_t* text);  // converted to the ANSI code page
@@ -29,7 +29,7 @@ class CVarAdapter {
 
     const std::string& Text() const { return m_text; }
 
-  private:
+private:
     std::string m_text;
 };
 

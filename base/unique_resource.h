@@ -6,7 +6,7 @@
 
 template <typename Traits>
 class UniqueResource {
-  public:
+public:
     using value_type = typename Traits::Type;
 
     UniqueResource() noexcept : m_value(Traits::None()) {}
@@ -47,7 +47,7 @@ class UniqueResource {
         return &m_value;
     }
 
-  private:
+private:
     value_type m_value;
 };
 

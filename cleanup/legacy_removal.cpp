@@ -1,10 +1,55 @@
 #include "cleanup/legacy_removal.h"
 
-// Filled in with the legacy component removal.
-void InstallSmartTag() {}
-void UninstallSmartTag() {}
-void ClearOldRMenuReg() {}
+#include "base/os_version.h"
+#include "base/registry.h"
+#include "base/registry_delete.h"
+#include "base/trace.h"
+
+// These keys belong to the calling account's own HKEY_CURRENT_USER: none of
+// the operations below is redirected to the console user.
+namespace {
+
+const wchar_t kSmartTagActionKey[] =
+    L"Software\\Microsoft\\Office\\Common\\Smart Tag\\Actions\\"
+    L"{0A4C50AC-AD3F-4245-B324-3C8696A3408A}";
+const wchar_t kOldRMenuClassKey[] = L"SOFTWARE\\Classes\\MrvRMenu.MirovanRightMenu";
+const wchar_t kOldRMenuClass1Key[] = L"SOFTWARE\\Classes\\MrvRMenu.MirovanRightMenu.1";
+const wchar_t kOldShareMenuKey[] =
+    L"SOFTWARE\\Classes\\*\\shellex\\ContextMenuHandlers\\MirovanShareMenu";
+const wchar_t kOldOutlookGeneralKey[] = L"Software\\Mirovan_Outlook\\General";
+
+}  // namespace
+
+void InstallSmartTag() {
+    CreateRegKey(HKEY_CURRENT_USER, kSmartTagActionKey, 0);
+    if (Is64BitSystem()) {
+        CreateRegKey(HKEY_CURRENT_USER, kSmartTagActionKey, KEY_WOW64_64KEY);
+    }
+}
+
+void UninstallSmartTag() {
+    CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, kSmartTagActionKey, 0);
+    if (Is64BitSystem()) {
+        CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, kSmartTagActionKey, KEY_WOW64_64KEY);
+    }
+}
+
+void ClearOldRMenuReg() {
+    DeleteRegValue(HKEY_CURRENT_USER, kOldRMenuClassKey, L"CurVer", 0);
+    DeleteRegValue(HKEY_CURRENT_USER, kOldRMenuClassKey, L"CLSID", 0);
+    CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, kOldRMenuClassKey, 0);
+    DeleteRegValue(HKEY_CURRENT_USER, kOldRMenuClass1Key, L"CLSID", 0);
+    CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, kOldRMenuClass1Key, 0);
+    CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, kOldShareMenuKey, 0);
+}
+
+// Filled in with the rest of the legacy component removal.
 void RemoveOldOIInstallFiles() {}
-void RemoveOldOIRegistry(HKEY) {}
+
+void RemoveOldOIRegistry(HKEY root) {
+    TraceLevel1(TraceValue("RemoveOldOIRegistry(HKEY hMainKey)."));
+    DeleteRegValue(root, kOldOutlookGeneralKey, L"NoSchedulePermission", 0);
+}
+
 void UnRegisterOldClassIDs() {}
 void RegQM64BitAddin() {}

@@ -28,7 +28,8 @@ user=$(ls "$c/users" | grep -v -x -e Public | head -n 1)
 appdata="$c/users/$user/AppData/Roaming"
 config="$appdata/Lotus/Sametime/.config/org.eclipse.update"
 
-reg() { wine reg add "$@" /f >/dev/null; }
+# The program is 32-bit: machine keys go to the 32-bit registry view.
+reg() { wine reg add "$@" /reg:32 /f >/dev/null; }
 section() { printf '\n== %s\n' "$1"; }
 listing() { (cd "$1" && find . -type f | sed 's|^\./||' | sort | sed 's/^/    /'); }
 
