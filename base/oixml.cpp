@@ -10,24 +10,46 @@ namespace {
 const int kMaxParseDepth = 256;
 const int kCDataWindow = 30;
 
-// Index of the last occurrence of sub that lies wholly inside text[0, end), or -1.
-int LastIndexBefore(const wchar_t* text, int end, const wchar_t* sub, int subLength) {
-    for (int i = end - subLength; i >= 0; --i) {
-        if (wmemcmp(text + i, sub, subLength) == 0) {
+// Index of the last "</" that lies wholly inside text[0, end), or -1.
+int LastClosingTag(const wchar_t* text, int end) {
+    for (int i = end - 2; i >= 0; --i) {
+        if (text[i] == L'<' && text[i + 1] == L'/') {
             return i;
         }
     }
     return -1;
 }
 
-// Index of the first occurrence of sub at or after start that begins before end, or -1.
-int FirstIndexFrom(const wchar_t* text, int length, int start, int end, const wchar_t* sub,
-                   int subLength) {
-    if (start < 0) {
-        start = 0;
+// Index of the first "</" that begins in text[start, end) and lies wholly
+// inside text[0, length), or -1.
+int FirstClosingTag(const wchar_t* text, int length, int start, int end) {
+    if (end > length - 1) {
+        end = length - 1;
     }
-    for (int i = start; i < end && i + subLength <= length; ++i) {
-        if (wmemcmp(text + i, sub, subLength) == 0) {
+    for (int i = start < 0 ? 0 : start; i < end; ++i) {
+        if (text[i] == L'<' && text[i + 1] == L'/') {
+            return i;
+        }
+    }
+    return -1;
+}
+
+// Index of the first ch in text[start, end), or -1.
+int FirstChar(const wchar_t* text, int start, int end, wchar_t ch) {
+    for (int i = start; i < end; ++i) {
+        if (text[i] == ch) {
+            return i;
+        }
+    }
+    return -1;
+}
+
+// Index of the last opening tag "<" name ">" that lies wholly inside
+// text[0, end), or -1.
+int LastOpeningTag(const wchar_t* text, int end, const wchar_t* name, int nameLength) {
+    for (int i = end - (nameLength + 2); i >= 0; --i) {
+        if (text[i] == L'<' && text[i + nameLength + 1] == L'>' &&
+            wmemcmp(text + i + 1, name, nameLength) == 0) {
             return i;
         }
     }
@@ -43,16 +65,38 @@ void TrimElementValue(CStringEx& value) {
     value.TrimRight(L' ');
 }
 
+// Concatenation of texts in one allocation.
+CStringEx Concatenate(const wchar_t* const* parts, const int* lengths, int count) {
+    long long total = 0;
+    for (int i = 0; i < count; ++i) {
+        total += lengths[i];
+    }
+    CStringEx joined;
+    if (total == 0 || total > 0x7FFFFFFE) {
+        return joined;
+    }
+    // GetBuffer of an empty string with room for total characters gives a
+    // zeroed buffer of total + 1.
+    wchar_t* out = joined.GetBuffer(total < 2 ? 2 : static_cast<int>(total));
+    if (out == nullptr) {
+        return joined;
+    }
+    for (int i = 0; i < count; ++i) {
+        wmemcpy(out, parts[i], lengths[i]);
+        out += lengths[i];
+    }
+    joined.ReleaseBuffer(-1);
+    return joined;
+}
+
+// "<" name ">" value children "</" name ">"
 CStringEx ElementXml(const CStringEx& name, const CStringEx& value, const CStringEx& children) {
-    CStringEx xml(L"<");
-    xml += name;
-    xml += L'>';
-    xml += value;
-    xml += children;
-    xml += L"</";
-    xml += name;
-    xml += L'>';
-    return xml;
+    const wchar_t* parts[] = {L"<",  name.c_str(), L">", value.c_str(), children.c_str(),
+                              L"</", name.c_str(), L">"};
+    int nameLength = name.GetLength();
+    const int lengths[] = {1, nameLength, 1, value.GetLength(), children.GetLength(),
+                           2, nameLength, 1};
+    return Concatenate(parts, lengths, 8);
 }
 
 }  // namespace
@@ -91,6 +135,32 @@ void OIXmlStripCData(CStringEx& value) {
     value.TrimRight();
     value.TrimRight(L"]]>");
 }
+
+// The text a parse works on: the characters [0, length) of a buffer that is
+// shortened in place as elements are cut out of it. An element's children
+// work on the prefix before its closing tag, in the same buffer.
+struct COIXML::ParseText {
+    wchar_t* data;
+    int length;
+    // The lowest index any cut has changed, so a parent knows whether the
+    // closing tag it found before is still where it was.
+    int lowestCut;
+    // No "</" begins at this index or later: what follows a cut is the
+    // remainder behind the last "</", so the next search for the last "</"
+    // need not read it again.
+    int closeSearchEnd;
+
+    // Cuts out [from, to), the element just read; text[to, length) is its
+    // remainder.
+    void Cut(int from, int to) {
+        wmemmove(data + from, data + to, static_cast<size_t>(length - to));
+        length -= to - from;
+        if (from < lowestCut) {
+            lowestCut = from;
+        }
+        closeSearchEnd = from + 1;
+    }
+};
 
 COIXML::COIXML() = default;
 
@@ -150,17 +220,42 @@ void COIXML::SetXML(const wchar_t* text) {
         m_xml.Empty();
         return;
     }
+    // The parse cuts the elements it reads out of a working copy, in place.
     CStringEx working(text);
-    ParseNode(working, 0);
+    int length = working.GetLength();
+    wchar_t* data = working.GetBuffer(-1);
+    if (data == nullptr) {
+        return;  // empty: nothing to read
+    }
+    ParseText parseText{data, length, length, length};
+    ParseNode(parseText, 0);
+    working.ReleaseBuffer(-1);
+}
+
+CStringEx COIXML::JoinChildXml() const {
+    if (m_childCount == 0) {
+        return CStringEx();
+    }
+    const wchar_t** parts = new (std::nothrow) const wchar_t*[m_childCount];
+    int* lengths = new (std::nothrow) int[m_childCount];
+    CStringEx joined;
+    if (parts != nullptr && lengths != nullptr) {
+        for (int i = 0; i < m_childCount; ++i) {
+            parts[i] = m_children[i]->m_xml.c_str();
+            lengths[i] = m_children[i]->m_xml.GetLength();
+        }
+        joined = Concatenate(parts, lengths, m_childCount);
+    }
+    delete[] parts;
+    delete[] lengths;
+    return joined;
 }
 
 void COIXML::Rebuild() {
-    CStringEx children;
     for (int i = 0; i < m_childCount; ++i) {
         m_children[i]->Rebuild();
-        children += m_children[i]->m_xml;
     }
-    m_xml = ElementXml(m_name, m_value, children);
+    m_xml = ElementXml(m_name, m_value, JoinChildXml());
 }
 
 void COIXML::GetXML(CStringEx& out) {
@@ -233,63 +328,69 @@ int COIXML::GetChildValue(const wchar_t* name, unsigned long& out) const {
     return result;
 }
 
-int COIXML::ParseNode(CStringEx& text, int depth) {
-    if (text.GetLength() < 2) {
+// The serialised form is not formatted here: GetXML rebuilds it from name,
+// value and children, and formatting it on every level would copy the whole
+// subtree once per level of nesting.
+int COIXML::ParseNode(ParseText& text, int depth) {
+    if (text.length < 2) {
         return -2;
     }
     if (depth > kMaxParseDepth) {
         return -1;
     }
-    const wchar_t* buffer = text.c_str();
-    int length = text.GetLength();
+    wchar_t* data = text.data;
+    int length = text.length;
 
     // The last closing tag ends this element; its name runs to the next '>'.
-    int closeAt = LastIndexBefore(buffer, length, L"</", 2);
+    int closeAt = LastClosingTag(data, text.closeSearchEnd < length ? text.closeSearchEnd : length);
     if (closeAt < 0) {
         return -1;
     }
     int nameStart = closeAt + 2;
-    int nameEnd = FirstIndexFrom(buffer, length, nameStart, length, L">", 1);
+    int nameEnd = FirstChar(data, nameStart, length, L'>');
     if (nameEnd < 0) {
         return -1;
     }
-    m_name = CStringEx(buffer + nameStart, nameEnd - nameStart);
+    int nameLength = nameEnd - nameStart;
+    m_name = CStringEx(data + nameStart, nameLength);
     int remainderStart = nameEnd + 1;
 
-    CStringEx openTag(L"<");
-    openTag += m_name;
-    openTag += L'>';
-    int openTagLength = openTag.GetLength();
-    int openAt = LastIndexBefore(buffer, closeAt, openTag.c_str(), openTagLength);
+    int openAt = LastOpeningTag(data, closeAt, data + nameStart, nameLength);
     if (openAt < 0) {
         return -1;
     }
-    int contentStart = openAt + openTagLength;
-    bool hasChildren = FirstIndexFrom(buffer, length, contentStart, closeAt, L"</", 2) >= 0;
+    int contentStart = openAt + nameLength + 2;
+    bool hasChildren = FirstClosingTag(data, length, contentStart, closeAt) >= 0;
 
     if (!hasChildren) {
-        m_value = CStringEx(buffer + contentStart, closeAt - contentStart);
+        m_value = CStringEx(data + contentStart, closeAt - contentStart);
         TrimElementValue(m_value);
-        text.Delete(openAt, remainderStart - openAt);
-        m_xml = ElementXml(m_name, m_value, CStringEx());
+        text.Cut(openAt, remainderStart);
         return 0;
     }
 
-    // Children are cut out of head from last to first.
-    CStringEx head(buffer, closeAt);
-    CStringEx remainder(buffer + remainderStart, length - remainderStart);
-    for (;;) {
-        if (FirstIndexFrom(head.c_str(), head.GetLength(), openAt, head.GetLength(), L"</", 2) <
-            0) {
-            break;
-        }
+    // Children are cut out of head (the text before the closing tag) from
+    // last to first. The remainder after the closing tag stays untouched
+    // meanwhile, since the children change only head.
+    ParseText head{data, closeAt, closeAt, closeAt};
+    int firstClose = FirstClosingTag(data, head.length, openAt, head.length);
+    while (firstClose >= 0) {
         COIXML* child = new (std::nothrow) COIXML();
         if (child == nullptr) {
             break;
         }
-        if (child->ParseNode(head, depth + 1) < 0 || !AppendChild(child)) {
+        int lowestBefore = head.lowestCut;
+        head.lowestCut = head.length;
+        int result = child->ParseNode(head, depth + 1);
+        int lowestCut = head.lowestCut;
+        head.lowestCut = lowestCut < lowestBefore ? lowestCut : lowestBefore;
+        if (result < 0 || !AppendChild(child)) {
             delete child;
             break;
+        }
+        // A cut wholly behind the first "</" leaves it in place.
+        if (lowestCut < firstClose + 2 || firstClose + 2 > head.length) {
+            firstClose = FirstClosingTag(data, head.length, openAt, head.length);
         }
     }
     for (int i = 0, j = m_childCount - 1; i < j; ++i, --j) {
@@ -298,15 +399,16 @@ int COIXML::ParseNode(CStringEx& text, int depth) {
         m_children[j] = swap;
     }
 
-    m_value = head.Mid(contentStart);
+    m_value = contentStart < head.length
+                  ? CStringEx(data + contentStart, head.length - contentStart)
+                  : CStringEx();
     TrimElementValue(m_value);
-    CStringEx children;
-    for (int i = 0; i < m_childCount; ++i) {
-        children += m_children[i]->m_xml;
+
+    // The text becomes head up to the opening tag, then the remainder.
+    int keep = openAt < head.length ? openAt : head.length;
+    if (head.lowestCut < text.lowestCut) {
+        text.lowestCut = head.lowestCut;
     }
-    m_xml = ElementXml(m_name, m_value, children);
-    CStringEx rest = head.Left(openAt);
-    rest += remainder;
-    text = rest;
+    text.Cut(keep, remainderStart);
     return 1;
 }

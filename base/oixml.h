@@ -37,15 +37,19 @@ public:
     const COIXML* GetChild(int index) const;
 
 private:
+    struct ParseText;
+
     // Reads the last element of `text` into this element and cuts it out of
     // `text`: -2 too short, -1 malformed, 0 leaf, 1 element with children.
-    int ParseNode(CStringEx& text, int depth);
+    int ParseNode(ParseText& text, int depth);
+    // The serialised children, concatenated in one allocation.
+    CStringEx JoinChildXml() const;
     void Rebuild();
     void DeleteChildren();
     bool AppendChild(COIXML* child);
     const COIXML* FindChild(const wchar_t* name) const;
 
-    CStringEx m_xml;
+    CStringEx m_xml;    // the serialised element as of the last Rebuild
     CStringEx m_value;  // escaped, as it stands in XML
     CStringEx m_name;
     COIXML** m_children = nullptr;

@@ -140,7 +140,10 @@ wchar_t* CStringEx::GetBuffer(int minLength) {
         return nullptr;
     }
     int length = GetLength();
-    if (minLength > length + 1) {
+    // Room for minLength characters and the terminator. An empty string is
+    // given a buffer only when at least two characters are asked for.
+    bool enlarge = length > 0 ? minLength > length : minLength > 1;
+    if (enlarge) {
         wchar_t* larger = new (std::nothrow) wchar_t[static_cast<size_t>(minLength) + 1]();
         if (larger == nullptr) {
             return nullptr;
@@ -456,6 +459,10 @@ void CStringEx::Format(const wchar_t* format, ...) {
 
 bool CStringEx::LoadString(HMODULE module, UINT id) {
     Empty();
+    // String ids are 16-bit; a larger id would wrap to another block's text.
+    if (id > 0xFFFF) {
+        return false;
+    }
     HRSRC block = FindResourceW(module, MAKEINTRESOURCEW((id / 16) + 1), MAKEINTRESOURCEW(6));
     if (block == nullptr) {
         return false;

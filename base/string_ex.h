@@ -35,7 +35,8 @@ public:
     wchar_t GetAt(int index) const noexcept;
 
     // Writable buffer of at least minLength characters plus terminator; null
-    // while locked, or for an empty string when no room is asked for.
+    // while locked, or for an empty string when fewer than two characters are
+    // asked for.
     wchar_t* GetBuffer(int minLength);
     void ReleaseBuffer(int ignored = -1) noexcept;
 
