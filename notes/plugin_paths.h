@@ -4,6 +4,8 @@
 
 #include <windows.h>
 
+#include "base/string_ex.h"
+
 // out = folder, one backslash, relative. Fails with out empty when folder is
 // missing or empty, when relative is empty, rooted, holds a drive colon or a
 // ".." step (so the result never leaves folder), or when the result would not
@@ -15,5 +17,18 @@ bool JoinFilePath(const wchar_t* folder, const wchar_t* relative, wchar_t (&out)
 // a drive root by accident, so it never qualifies.
 bool IsUsableFolder(const wchar_t* folder);
 
+// True for a null or empty text.
+inline bool IsEmptyText(const wchar_t* text) {
+    return text == nullptr || *text == L'\0';
+}
+
 // True when path names an existing file (not a folder).
 bool IsRegularFile(const wchar_t* path);
+
+// folder\relative with exactly one backslash between them, as a string (no
+// length limit: a path too long for the file functions makes them fail).
+inline CStringEx JoinLocalPath(const wchar_t* folder, const wchar_t* relative) {
+    CStringEx path(folder);
+    CStringEx::PathAppend(path, relative);
+    return path;
+}

@@ -1,0 +1,244 @@
+#include "notes/platform_xml.h"
+
+#include <msxml2.h>
+
+#include "base/com_ptr.h"
+#include "base/trace.h"
+#include "notes/untrusted_xml_bytes.h"
+
+namespace {
+
+// DOMDocument 3.0 and the interfaces asked of it (declared but not defined by
+// the mingw headers).
+const CLSID kClsidDomDocument30 = {
+    0xF5078F32, 0xC551, 0x11D3, {0x89, 0xB9, 0x00, 0x00, 0xF8, 0x1F, 0xE2, 0x21}};
+const IID kIidXmlDomDocument = {
+    0x2933BF81, 0x7B36, 0x11D2, {0xB2, 0x0E, 0x00, 0xC0, 0x4F, 0x98, 0x3E, 0x60}};
+const IID kIidXmlDomDocument2 = {
+    0x2933BF95, 0x7B36, 0x11D2, {0xB2, 0x0E, 0x00, 0xC0, 0x4F, 0x98, 0x3E, 0x60}};
+
+// Relative to the site element.
+const wchar_t kFeatureXPath[] = L"feature[@id=\"com.mrv.realtime.meeting.feature\"]";
+const wchar_t kFeatureElement[] = L"feature";
+
+struct FeatureAttribute {
+    const wchar_t* name;
+    const wchar_t* value;
+};
+// In this order: Eclipse readers and people compare the text.
+const FeatureAttribute kFeatureAttributes[] = {
+    {L"id", L"com.mrv.realtime.meeting.feature"},
+    {L"url", L"features/com.mrv.realtime.meeting.feature_1.0.1/"},
+    {L"version", L"1.0.1"},
+};
+
+// Deeper nesting than any configuration file has; a guard where the parser
+// honours it.
+const LONG kMaxElementDepth = 256;
+
+UniqueBstr MakeBstr(const wchar_t* text) {
+    return UniqueBstr(SysAllocString(text));
+}
+
+void SetStringVariant(UniqueVariant& variant, const wchar_t* text) {
+    VariantClear(variant.get());
+    V_VT(variant.get()) = VT_BSTR;
+    V_BSTR(variant.get()) = SysAllocString(text);
+}
+
+void LogLoadRefusal(UntrustedXmlRead reason) {
+    const char* text = nullptr;
+    switch (reason) {
+        case UntrustedXmlRead::kUnreadable:
+            text = "PlatformXml: the file cannot be read\n";
+            break;
+        case UntrustedXmlRead::kEmpty:
+            text = "PlatformXml: the file is empty\n";
+            break;
+        case UntrustedXmlRead::kTooLarge:
+            text = "PlatformXml: the file is too large\n";
+            break;
+        case UntrustedXmlRead::kHasDoctype:
+            text = "PlatformXml: the file has a document type declaration\n";
+            break;
+        case UntrustedXmlRead::kOk:
+            return;
+    }
+    TraceLevel4(TraceValue(text));
+}
+
+// One platform.xml opened at its site element.
+class CPlatformXml {
+public:
+    PlatformXmlStatus Open(const wchar_t* path, const SiteXPaths& sites) {
+        if (FAILED(CoCreateInstance(kClsidDomDocument30, nullptr, CLSCTX_ALL, kIidXmlDomDocument,
+                                    m_doc.put_void())) ||
+            !m_doc) {
+            return PlatformXmlStatus::kCannotCreate;
+        }
+        if (!Load(path)) {
+            return PlatformXmlStatus::kLoadFailed;
+        }
+        for (const wchar_t* xpath : sites) {
+            if (xpath != nullptr && SelectSingle(m_doc.get(), xpath, &m_site)) {
+                return PlatformXmlStatus::kOk;
+            }
+        }
+        return PlatformXmlStatus::kNoSite;
+    }
+
+    bool FindFeature(ComPtr<IXMLDOMNode>* feature) {
+        return SelectSingle(m_site.get(), kFeatureXPath, feature);
+    }
+
+    // Appends <feature id url version/> as the site's last child.
+    bool AddFeature() {
+        ComPtr<IXMLDOMElement> element;
+        UniqueBstr name = MakeBstr(kFeatureElement);
+        if (m_doc->createElement(name.get(), element.put()) != S_OK || !element) {
+            return false;
+        }
+        ComPtr<IXMLDOMNamedNodeMap> attributes;
+        if (element->get_attributes(attributes.put()) != S_OK || !attributes) {
+            return false;
+        }
+        for (const FeatureAttribute& item : kFeatureAttributes) {
+            ComPtr<IXMLDOMAttribute> attribute;
+            UniqueBstr attributeName = MakeBstr(item.name);
+            if (m_doc->createAttribute(attributeName.get(), attribute.put()) != S_OK ||
+                !attribute) {
+                return false;
+            }
+            UniqueVariant value;
+            SetStringVariant(value, item.value);
+            ComPtr<IXMLDOMNode> added;
+            if (FAILED(attribute->put_nodeValue(*value.get())) ||
+                FAILED(attributes->setNamedItem(attribute.get(), added.put()))) {
+                return false;
+            }
+        }
+        ComPtr<IXMLDOMNode> appended;
+        return m_site->appendChild(element.get(), appended.put()) == S_OK;
+    }
+
+    bool RemoveFeature(const ComPtr<IXMLDOMNode>& feature) {
+        ComPtr<IXMLDOMNode> removed;
+        return m_site->removeChild(feature.get(), removed.put()) == S_OK;
+    }
+
+    bool Save(const wchar_t* path) {
+        UniqueVariant destination;
+        SetStringVariant(destination, path);
+        return m_doc->save(*destination.get()) == S_OK;
+    }
+
+private:
+    // S_FALSE with a null node means "nothing selected".
+    static bool SelectSingle(IXMLDOMNode* from, const wchar_t* xpath, ComPtr<IXMLDOMNode>* out) {
+        UniqueBstr query = MakeBstr(xpath);
+        return from->selectSingleNode(query.get(), out->put()) == S_OK && *out;
+    }
+
+    static void SetProperty(IXMLDOMDocument2* doc, const wchar_t* name, VARIANT value) {
+        UniqueBstr property = MakeBstr(name);
+        // Best effort: a parser that does not know a property keeps its default.
+        doc->setProperty(property.get(), value);
+    }
+
+    // No validation, no external resolution, no DTD; the bytes parsed are the
+    // bytes that passed the checks.
+    bool Load(const wchar_t* path) {
+        m_doc->put_async(VARIANT_FALSE);
+        m_doc->put_validateOnParse(VARIANT_FALSE);
+        m_doc->put_resolveExternals(VARIANT_FALSE);
+        ComPtr<IXMLDOMDocument2> doc2;
+        if (SUCCEEDED(m_doc->QueryInterface(kIidXmlDomDocument2, doc2.put_void())) && doc2) {
+            UniqueVariant language;
+            SetStringVariant(language, L"XPath");
+            SetProperty(doc2.get(), L"SelectionLanguage", *language.get());
+            VARIANT prohibit;
+            VariantInit(&prohibit);
+            V_VT(&prohibit) = VT_BOOL;
+            V_BOOL(&prohibit) = VARIANT_TRUE;
+            SetProperty(doc2.get(), L"ProhibitDTD", prohibit);
+            VARIANT depth;
+            VariantInit(&depth);
+            V_VT(&depth) = VT_I4;
+            V_I4(&depth) = kMaxElementDepth;
+            SetProperty(doc2.get(), L"MaxElementDepth", depth);
+        }
+
+        UniqueVariant source;
+        SAFEARRAY* bytes = nullptr;
+        UntrustedXmlRead read = ReadUntrustedXml(path, &bytes);
+        if (read != UntrustedXmlRead::kOk) {
+            LogLoadRefusal(read);
+            return false;
+        }
+        V_VT(source.get()) = VT_ARRAY | VT_UI1;
+        V_ARRAY(source.get()) = bytes;  // the variant owns the array now
+
+        VARIANT_BOOL loaded = VARIANT_FALSE;
+        if (m_doc->load(*source.get(), &loaded) != S_OK || loaded != VARIANT_TRUE) {
+            return false;
+        }
+        // A declaration the byte check could not see still ends here.
+        ComPtr<IXMLDOMDocumentType> doctype;
+        if (m_doc->get_doctype(doctype.put()) == S_OK && doctype) {
+            LogLoadRefusal(UntrustedXmlRead::kHasDoctype);
+            return false;
+        }
+        return true;
+    }
+
+    ComPtr<IXMLDOMDocument> m_doc;
+    ComPtr<IXMLDOMNode> m_site;
+};
+
+}  // namespace
+
+PlatformXmlEdit EditPlatformXml(const wchar_t* path, const SiteXPaths& sites, bool enable,
+                                SaveGate gate) {
+    PlatformXmlEdit result;
+    CPlatformXml xml;
+    result.status = xml.Open(path, sites);
+    if (result.status != PlatformXmlStatus::kOk) {
+        return result;
+    }
+    ComPtr<IXMLDOMNode> feature;
+    bool listed = xml.FindFeature(&feature);
+    if (enable && !listed) {
+        if (!xml.AddFeature()) {
+            result.status = PlatformXmlStatus::kEditFailed;
+            return result;
+        }
+        result.changed = true;
+    } else if (!enable && listed) {
+        if (!xml.RemoveFeature(feature)) {
+            result.status = PlatformXmlStatus::kEditFailed;
+            return result;
+        }
+        result.changed = true;
+    }
+    if (gate != nullptr && !gate(path)) {
+        return result;  // not writable: left as it is, silently
+    }
+    result.saved = xml.Save(path);
+    if (!result.saved && result.changed) {
+        result.status = PlatformXmlStatus::kSaveFailed;
+    }
+    return result;
+}
+
+PlatformXmlStatus TestPlatformXml(const wchar_t* path, const SiteXPaths& sites, bool* listed) {
+    if (listed != nullptr) {
+        *listed = false;
+    }
+    CPlatformXml xml;
+    PlatformXmlStatus status = xml.Open(path, sites);
+    if (status == PlatformXmlStatus::kOk && listed != nullptr) {
+        ComPtr<IXMLDOMNode> feature;
+        *listed = xml.FindFeature(&feature);
+    }
+    return status;
+}
