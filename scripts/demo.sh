@@ -41,6 +41,8 @@ for f in lcppn30.dll ndbmrvqm.dll qmnires.dll NIURL.dll qmMRVURL.DLL qmnwintc.dl
   echo "suite build 2.0 copy of $f" > "$suite/$f"
 done
 echo "old copy held by Notes" > "$notes/qmnires.dll"
+echo "Notes' own URL handler, never replaced nor removed" > "$notes/NIURL.dll"
+echo "the user's meeting database" > "$notes/mirovan.nsf"
 cp "$build/bin/qmMrvONI.exe" "$build/bin/fakes/mrvtrace.dll" "$build/bin/fakes/qmusredt.dll" "$suite/"
 reg 'HKLM\SOFTWARE\Mirovan\QmkTools' /v Path /d 'C:\Program Files\Quillmark Tools'
 reg 'HKLM\SOFTWARE\Lotus\Notes\8.0' /v Path /d 'C:\Program Files\IBM\Lotus\Notes'
@@ -55,13 +57,16 @@ cat > "$config/platform.xml" <<'XML'
 </config>
 XML
 touch "$config/last.config.stamp"
-wineserver -w
 echo "  suite folder: C:\\Program Files\\Quillmark Tools"
 listing "$suite"
 echo "  Notes folder: C:\\Program Files\\IBM\\Lotus\\Notes"
 listing "$notes"
 
-run() { wine "$build/bin/demo/demo_runner.exe" 'C:\Program Files\Quillmark Tools' "$@" | tr -d '\r'; }
+# Wine's helper processes would hold a pipe open: output goes through a file.
+run() {
+  wine "$build/bin/demo/demo_runner.exe" 'C:\Program Files\Quillmark Tools' "$@" > "$prefix/run.out" 2>&1
+  tr -d '\r' < "$prefix/run.out"
+}
 
 section "Maintenance command: copy the Notes plug-in files into Notes"
 run -copyfilestonotes
