@@ -5,7 +5,7 @@
 #include "base/string_ex.h"
 
 class COneClickItemHandler {
-  public:
+public:
     // browserName may be null.
     explicit COneClickItemHandler(const wchar_t* browserName);
     virtual ~COneClickItemHandler() = default;
@@ -13,6 +13,6 @@ class COneClickItemHandler {
     // 1 when a method of the one-click object was called, else 0.
     int Handle(CommandInfo& commandInfo);
 
-  private:
+private:
     CStringEx m_browserName;
 };

@@ -2,7 +2,7 @@
 #pragma once
 
 class CSendProblemReport {
-  public:
+public:
     CSendProblemReport() = default;
     virtual ~CSendProblemReport() = default;
 

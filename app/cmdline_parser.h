@@ -6,7 +6,7 @@
 #include "base/string_ex.h"
 
 class CCmdLineParser {
-  public:
+public:
     CCmdLineParser() = default;
     virtual ~CCmdLineParser() = default;
 
@@ -15,7 +15,7 @@ class CCmdLineParser {
     // 0 when no Action was recognised; otherwise copies the record and gives 1.
     int GetCommandInfo(CommandInfo& out) const;
 
-  private:
+private:
     CommandInfo m_sCommandInfo;
 };
 

@@ -14,7 +14,7 @@ FARPROC LoadSuiteLibraryExport(const char* exportName, HMODULE* moduleHandle);
 
 // Holds qmusredt.dll from construction (with the flag 1) to its end.
 class SuiteLibraryHolder {
-  public:
+public:
     explicit SuiteLibraryHolder(int load);
     ~SuiteLibraryHolder();
     SuiteLibraryHolder(const SuiteLibraryHolder&) = delete;
@@ -23,6 +23,6 @@ class SuiteLibraryHolder {
     HMODULE Module() const { return m_module; }
     void End();
 
-  private:
+private:
     HMODULE m_module = nullptr;
 };

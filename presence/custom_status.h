@@ -2,7 +2,7 @@
 #pragma once
 
 class CMOCCustomStatusInstall {
-  public:
+public:
     CMOCCustomStatusInstall() = default;
     virtual ~CMOCCustomStatusInstall() = default;
 
