@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "bench/process_timing.h"
 #include "cleanup/path_entries.h"
 #include "cleanup/system_env_path.h"
 
@@ -19,17 +20,6 @@ namespace {
 const wchar_t kEnvironment[] = L"SYSTEM\\CurrentControlSet\\Control\\Session Manager\\Environment";
 const size_t kPathChars = 32000;
 const wchar_t kSuite[] = L"C:\\Program Files\\Mirovan\\Quillmark Tools";
-
-double NowMs() {
-    static LARGE_INTEGER frequency = [] {
-        LARGE_INTEGER f;
-        QueryPerformanceFrequency(&f);
-        return f;
-    }();
-    LARGE_INTEGER now;
-    QueryPerformanceCounter(&now);
-    return 1000.0 * static_cast<double>(now.QuadPart) / static_cast<double>(frequency.QuadPart);
-}
 
 struct RawValue {
     bool present = false;
@@ -87,15 +77,6 @@ std::wstring LongPath() {
     return text;
 }
 
-struct Series {
-    const char* name;
-    std::vector<double> ms;
-    double Median() {
-        std::sort(ms.begin(), ms.end());
-        return ms.empty() ? 0.0 : ms[ms.size() / 2];
-    }
-};
-
 }  // namespace
 
 int wmain(int argc, wchar_t** argv) {
@@ -116,32 +97,32 @@ int wmain(int argc, wchar_t** argv) {
     bool allOk = true;
     std::wstring withSuite = path + L";" + kSuite;
     for (int i = 0; i < repetitions; ++i) {
-        double start = NowMs();
+        double start = NowMilliseconds();
         allOk &= WriteRaw(ReadRaw());
-        raw.ms.push_back(NowMs() - start);
+        raw.ms.push_back(NowMilliseconds() - start);
 
-        start = NowMs();
+        start = NowMilliseconds();
         RefreshSysEnv();
-        broadcast.ms.push_back(NowMs() - start);
+        broadcast.ms.push_back(NowMilliseconds() - start);
 
-        start = NowMs();
+        start = NowMilliseconds();
         SetQMInstallPathToSystemEnv(kSuite);
-        add.ms.push_back(NowMs() - start);
+        add.ms.push_back(NowMilliseconds() - start);
         RawValue after = ReadRaw();
         allOk &= after.data.size() == (withSuite.size() + 1) * sizeof(wchar_t) &&
                  after.type == REG_EXPAND_SZ;
 
-        start = NowMs();
+        start = NowMilliseconds();
         RemoveQMInstallPathFromSystemEnv(kSuite);
-        remove.ms.push_back(NowMs() - start);
+        remove.ms.push_back(NowMilliseconds() - start);
         allOk &= ReadRaw().data == FromText(path).data;
 
-        start = NowMs();
+        start = NowMilliseconds();
         CStringEx appended = AppendPathEntry(path.c_str(), kSuite);
-        textAdd.ms.push_back(NowMs() - start);
-        start = NowMs();
+        textAdd.ms.push_back(NowMilliseconds() - start);
+        start = NowMilliseconds();
         CStringEx removed = RemovePathEntries(withSuite.c_str(), kSuite);
-        textRemove.ms.push_back(NowMs() - start);
+        textRemove.ms.push_back(NowMilliseconds() - start);
         allOk &= withSuite == appended.c_str() && path == removed.c_str();
     }
     WriteRaw(original);

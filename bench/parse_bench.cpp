@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "bench/process_timing.h"
 #include "app/cmdline_parser.h"
 #include "app/command_info.h"
 
@@ -104,17 +105,6 @@ std::vector<Shape> Shapes() {
     return shapes;
 }
 
-double NowMs() {
-    static LARGE_INTEGER frequency = [] {
-        LARGE_INTEGER f;
-        QueryPerformanceFrequency(&f);
-        return f;
-    }();
-    LARGE_INTEGER now;
-    QueryPerformanceCounter(&now);
-    return static_cast<double>(now.QuadPart) * 1000.0 / static_cast<double>(frequency.QuadPart);
-}
-
 }  // namespace
 
 int wmain(int argc, wchar_t** argv) {
@@ -139,9 +129,9 @@ int wmain(int argc, wchar_t** argv) {
         bool resultOk = true;
         for (int i = 0; i < repetitions; ++i) {
             CCmdLineParser parser;
-            double start = NowMs();
+            double start = NowMilliseconds();
             int parsed = parser.Parse(text);
-            double elapsed = NowMs() - start;
+            double elapsed = NowMilliseconds() - start;
             CommandInfo info;
             int action = parser.GetCommandInfo(info) ? info.nAction : 0;
             resultOk = resultOk && (parsed != 0) == (shape.expectedAction != 0) &&

@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "bench/process_timing.h"
 #include "notes/platform_xml.h"
 
 namespace {
@@ -18,17 +19,6 @@ namespace {
 const size_t kTargetBytes = 5u * 1024 * 1024;
 const SiteXPaths kSites = {L"//site[@url=\"file:../shared/eclipse/\"]",
                            L"//site[@url=\"file:../../shared/eclipse/\"]"};
-
-double NowMs() {
-    static LARGE_INTEGER frequency = [] {
-        LARGE_INTEGER f;
-        QueryPerformanceFrequency(&f);
-        return f;
-    }();
-    LARGE_INTEGER now;
-    QueryPerformanceCounter(&now);
-    return 1000.0 * static_cast<double>(now.QuadPart) / static_cast<double>(frequency.QuadPart);
-}
 
 std::string Feature(const std::string& name, int i) {
     std::string id = "com.example." + name + std::to_string(i);
@@ -85,15 +75,6 @@ std::string ReadAll(const std::wstring& path) {
     return bytes;
 }
 
-struct Series {
-    const char* name;
-    std::vector<double> ms;
-    double Median() {
-        std::sort(ms.begin(), ms.end());
-        return ms.empty() ? 0.0 : ms[ms.size() / 2];
-    }
-};
-
 }  // namespace
 
 int wmain(int argc, wchar_t** argv) {
@@ -122,29 +103,29 @@ int wmain(int argc, wchar_t** argv) {
     Series disable{"disable (remove the feature)", {}};
     bool allOk = true;
     for (int i = 0; i < repetitions; ++i) {
-        double start = NowMs();
+        double start = NowMilliseconds();
         allOk &= WriteAll(path, ReadAll(path));
-        raw.ms.push_back(NowMs() - start);
+        raw.ms.push_back(NowMilliseconds() - start);
 
-        start = NowMs();
+        start = NowMilliseconds();
         PlatformXmlEdit edit = EditPlatformXml(path.c_str(), kSites, false, nullptr);
-        unchanged.ms.push_back(NowMs() - start);
+        unchanged.ms.push_back(NowMilliseconds() - start);
         allOk &= edit.status == PlatformXmlStatus::kOk && !edit.changed;
 
         bool listed = true;
-        start = NowMs();
+        start = NowMilliseconds();
         allOk &= TestPlatformXml(path.c_str(), kSites, &listed) == PlatformXmlStatus::kOk;
-        test.ms.push_back(NowMs() - start);
+        test.ms.push_back(NowMilliseconds() - start);
         allOk &= !listed;
 
-        start = NowMs();
+        start = NowMilliseconds();
         edit = EditPlatformXml(path.c_str(), kSites, true, nullptr);
-        enable.ms.push_back(NowMs() - start);
+        enable.ms.push_back(NowMilliseconds() - start);
         allOk &= edit.status == PlatformXmlStatus::kOk && edit.changed;
 
-        start = NowMs();
+        start = NowMilliseconds();
         edit = EditPlatformXml(path.c_str(), kSites, false, nullptr);
-        disable.ms.push_back(NowMs() - start);
+        disable.ms.push_back(NowMilliseconds() - start);
         allOk &= edit.status == PlatformXmlStatus::kOk && edit.changed;
     }
     std::printf("platform.xml of %u bytes, %d repetitions (median ms)\n",

@@ -3,7 +3,9 @@
 
 #include <windows.h>
 
+#include <algorithm>
 #include <string>
+#include <vector>
 
 // Mean wall time in milliseconds of `runs` runs of commandLine (started,
 // waited for, closed), after `warmUp` unmeasured runs.
@@ -11,3 +13,13 @@ double MeanProcessMilliseconds(const std::wstring& commandLine, int runs, int wa
 
 // Milliseconds since an arbitrary start, with sub-millisecond resolution.
 double NowMilliseconds();
+
+// Measurements of one kind, in milliseconds.
+struct Series {
+    const char* name;
+    std::vector<double> ms;
+    double Median() {
+        std::sort(ms.begin(), ms.end());
+        return ms.empty() ? 0.0 : ms[ms.size() / 2];
+    }
+};

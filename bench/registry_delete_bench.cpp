@@ -9,6 +9,7 @@
 #include <string>
 #include <vector>
 
+#include "bench/process_timing.h"
 #include "base/registry_delete.h"
 
 namespace {
@@ -17,17 +18,6 @@ const int kRounds = 5;
 const int kFirstLevel = 10;
 const int kSecondLevel = 10;
 const int kLeaves = 100;
-
-double NowMs() {
-    static LARGE_INTEGER frequency = [] {
-        LARGE_INTEGER f;
-        QueryPerformanceFrequency(&f);
-        return f;
-    }();
-    LARGE_INTEGER now;
-    QueryPerformanceCounter(&now);
-    return 1000.0 * static_cast<double>(now.QuadPart) / static_cast<double>(frequency.QuadPart);
-}
 
 bool MakeKey(HKEY parent, const std::wstring& name, HKEY* out) {
     return RegCreateKeyExW(parent, name.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS, nullptr, out,
@@ -126,18 +116,18 @@ int wmain() {
                 kSecondLevel, kLeaves);
     for (int round = 1; round <= kRounds; ++round) {
         int made = BuildTree(tree);
-        double start = NowMs();
+        double start = NowMilliseconds();
         BOOL deleted = CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, tree.c_str(), 0);
-        double ourMs = NowMs() - start;
+        double ourMs = NowMilliseconds() - start;
         if (!deleted || KeyExists(tree)) {
             std::printf("round %d: RecurDeleteKey failed\n", round);
             return 1;
         }
 
         int madeAgain = BuildTree(tree);
-        start = NowMs();
+        start = NowMilliseconds();
         int regExit = RunReg(tree);
-        double regMs = NowMs() - start;
+        double regMs = NowMilliseconds() - start;
         if (regExit != 0 || KeyExists(tree)) {
             std::printf("round %d: reg.exe failed (exit %d)\n", round, regExit);
             return 1;
@@ -155,9 +145,9 @@ int wmain() {
         if (MakeKey(HKEY_CURRENT_USER, tree, &single)) {
             RegCloseKey(single);
         }
-        double start = NowMs();
+        double start = NowMilliseconds();
         RunReg(tree);
-        startOnly.push_back(NowMs() - start);
+        startOnly.push_back(NowMilliseconds() - start);
     }
     double ourMedian = Median(ours);
     double regMedian = Median(theirs);

@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "tests/support/file_util.h"
+#include "tests/support/held_files.h"
 #include "tests/support/machine_fixture.h"
 #include "tests/support/registry_util.h"
 
@@ -63,41 +64,6 @@ const wchar_t kSuiteKey[] = L"SOFTWARE\\Mirovan\\QmkTools";
 const wchar_t kNotes6[] = L"SOFTWARE\\Lotus\\Notes\\6.0";
 const wchar_t kNotes8[] = L"SOFTWARE\\Lotus\\Notes\\8.0";
 const wchar_t kNIKey[] = L"SOFTWARE\\mirovan\\NI";
-const DWORD kLikeALoadedLibrary = FILE_SHARE_READ | FILE_SHARE_DELETE;
-
-bool IsPendingDelete(const std::wstring& path) {
-    std::vector<std::wstring> list =
-        RegGetMultiString(HKEY_LOCAL_MACHINE, kSessionManagerKey, L"PendingFileRenameOperations");
-    for (size_t i = 0; i < list.size(); i += 2) {
-        std::wstring from = list[i];
-        if (from.compare(0, 4, L"\\??\\") == 0) {
-            from = from.substr(4);
-        }
-        if (lstrcmpiW(from.c_str(), path.c_str()) == 0 &&
-            (i + 1 == list.size() || list[i + 1].empty())) {
-            return true;
-        }
-    }
-    return false;
-}
-
-class HeldOpen {
-public:
-    HeldOpen(const std::wstring& path, DWORD share)
-        : m_handle(CreateFileW(path.c_str(), GENERIC_READ, share, nullptr, OPEN_EXISTING,
-                               FILE_ATTRIBUTE_NORMAL, nullptr)) {}
-    ~HeldOpen() {
-        if (ok()) {
-            CloseHandle(m_handle);
-        }
-    }
-    HeldOpen(const HeldOpen&) = delete;
-    HeldOpen& operator=(const HeldOpen&) = delete;
-    bool ok() const { return m_handle != INVALID_HANDLE_VALUE; }
-
-private:
-    HANDLE m_handle;
-};
 
 std::string Origin(const char* place, const wchar_t* name) {
     return std::string(place) + ":" + Narrow(name);

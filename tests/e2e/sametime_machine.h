@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "tests/support/file_util.h"
+#include "tests/support/held_files.h"
 #include "tests/support/machine_fixture.h"
 #include "tests/support/registry_util.h"
 
@@ -63,54 +64,6 @@ inline size_t CountOf(const std::string& text, const std::string& part) {
 inline std::string Origin(const char* place, const wchar_t* name) {
     return std::string(place) + ":" + Narrow(name);
 }
-
-// True when path is listed for deletion at the next restart.
-inline bool IsPendingDelete(const std::wstring& path) {
-    std::vector<std::wstring> list =
-        RegGetMultiString(HKEY_LOCAL_MACHINE, kSessionManagerKey, L"PendingFileRenameOperations");
-    for (size_t i = 0; i < list.size(); i += 2) {
-        std::wstring from = list[i];
-        if (from.compare(0, 4, L"\\??\\") == 0) {
-            from = from.substr(4);
-        }
-        if (lstrcmpiW(from.c_str(), path.c_str()) == 0 &&
-            (i + 1 == list.size() || list[i + 1].empty())) {
-            return true;
-        }
-    }
-    return false;
-}
-
-// Paths listed for deletion at the next restart (the list's final empty
-// target may be dropped by the reader, so the paths are counted).
-inline size_t PendingDeleteCount() {
-    size_t count = 0;
-    for (const std::wstring& entry : RegGetMultiString(HKEY_LOCAL_MACHINE, kSessionManagerKey,
-                                                       L"PendingFileRenameOperations")) {
-        count += entry.empty() ? 0 : 1;
-    }
-    return count;
-}
-
-// A file held open by another reader that shares reading only (how a
-// running client or a second program keeps others from writing it).
-class HeldOpen {
-public:
-    HeldOpen(const std::wstring& path, DWORD share)
-        : m_handle(CreateFileW(path.c_str(), GENERIC_READ, share, nullptr, OPEN_EXISTING,
-                               FILE_ATTRIBUTE_NORMAL, nullptr)) {}
-    ~HeldOpen() {
-        if (ok()) {
-            CloseHandle(m_handle);
-        }
-    }
-    HeldOpen(const HeldOpen&) = delete;
-    HeldOpen& operator=(const HeldOpen&) = delete;
-    bool ok() const { return m_handle != INVALID_HANDLE_VALUE; }
-
-private:
-    HANDLE m_handle;
-};
 
 class SametimeMachine : public MachineTest {
 protected:

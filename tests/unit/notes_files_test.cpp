@@ -17,61 +17,11 @@
 #include "notes/plugin_file_lists.h"
 #include "notes/plugin_paths.h"
 #include "tests/support/file_util.h"
+#include "tests/support/held_files.h"
 #include "tests/support/machine_fixture.h"
 #include "tests/support/registry_util.h"
 
 namespace {
-
-bool SameText(const std::wstring& a, const std::wstring& b) {
-    return lstrcmpiW(a.c_str(), b.c_str()) == 0;
-}
-
-// True when path is listed for deletion at the next restart.
-bool IsPendingDelete(const std::wstring& path) {
-    std::vector<std::wstring> list =
-        RegGetMultiString(HKEY_LOCAL_MACHINE, kSessionManagerKey, L"PendingFileRenameOperations");
-    // Pairs of (source, destination); the empty destination of the last pair
-    // reads as the list's end.
-    for (size_t i = 0; i < list.size(); i += 2) {
-        std::wstring from = list[i];
-        if (from.compare(0, 4, L"\\??\\") == 0) {
-            from = from.substr(4);
-        }
-        if (SameText(from, path) && (i + 1 == list.size() || list[i + 1].empty())) {
-            return true;
-        }
-    }
-    return false;
-}
-
-// A handle the test holds on a file, as a running process would.
-class HeldOpen {
-public:
-    HeldOpen(const std::wstring& path, DWORD share)
-        : m_handle(CreateFileW(path.c_str(), GENERIC_READ, share, nullptr, OPEN_EXISTING,
-                               FILE_ATTRIBUTE_NORMAL, nullptr)) {}
-    ~HeldOpen() {
-        if (ok()) {
-            CloseHandle(m_handle);
-        }
-    }
-    HeldOpen(const HeldOpen&) = delete;
-    HeldOpen& operator=(const HeldOpen&) = delete;
-    bool ok() const { return m_handle != INVALID_HANDLE_VALUE; }
-    // What the holder reads from the start of its file.
-    std::string Read() const {
-        SetFilePointer(m_handle, 0, nullptr, FILE_BEGIN);
-        char buffer[256];
-        DWORD got = 0;
-        ReadFile(m_handle, buffer, sizeof(buffer), &got, nullptr);
-        return std::string(buffer, got);
-    }
-
-private:
-    HANDLE m_handle;
-};
-
-const DWORD kLikeALoadedLibrary = FILE_SHARE_READ | FILE_SHARE_DELETE;
 
 SYSTEMTIME TimeOf(WORD year, WORD month, WORD day, WORD hour, WORD minute, WORD second) {
     SYSTEMTIME t = {};
