@@ -28,6 +28,23 @@ wchar_t FoldAscii(wchar_t ch) {
     return (ch >= L'A' && ch <= L'Z') ? static_cast<wchar_t>(ch + (L'a' - L'A')) : ch;
 }
 
+// The order when either text is empty or null: an empty string equals a
+// null or empty text and precedes any other; a text follows null. False when
+// both texts have characters to compare.
+bool CompareWithEmpty(const wchar_t* self, const wchar_t* other, int* order) {
+    bool selfEmpty = self == nullptr || self[0] == L'\0';
+    bool otherEmpty = other == nullptr || other[0] == L'\0';
+    if (selfEmpty) {
+        *order = otherEmpty ? 0 : -1;
+        return true;
+    }
+    if (other == nullptr) {
+        *order = 1;
+        return true;
+    }
+    return false;
+}
+
 int Sign(int value) {
     return value < 0 ? -1 : (value > 0 ? 1 : 0);
 }
@@ -166,25 +183,17 @@ void CStringEx::ReleaseBuffer(int /*ignored*/) noexcept {
 }
 
 int CStringEx::Compare(const wchar_t* other) const noexcept {
-    bool selfEmpty = IsEmpty();
-    bool otherEmpty = other == nullptr || other[0] == L'\0';
-    if (selfEmpty) {
-        return otherEmpty ? 0 : -1;
-    }
-    if (other == nullptr) {
-        return 1;
+    int emptyOrder;
+    if (CompareWithEmpty(m_buffer, other, &emptyOrder)) {
+        return emptyOrder;
     }
     return Sign(wcscmp(m_buffer, other));
 }
 
 int CStringEx::CompareNoCase(const wchar_t* other) const noexcept {
-    bool selfEmpty = IsEmpty();
-    bool otherEmpty = other == nullptr || other[0] == L'\0';
-    if (selfEmpty) {
-        return otherEmpty ? 0 : -1;
-    }
-    if (other == nullptr) {
-        return 1;
+    int emptyOrder;
+    if (CompareWithEmpty(m_buffer, other, &emptyOrder)) {
+        return emptyOrder;
     }
     const wchar_t* a = m_buffer;
     const wchar_t* b = other;
