@@ -4,101 +4,160 @@
 #include "tests/e2e/sametime_machine.h"
 #include "tests/support/setting_change_listener.h"
 
+#include <memory>
+
 using namespace sametime_test;
 
 namespace {
 
+// Folders of the layouts: Sametime 8 and the Notes data folder (embedded).
+const wchar_t kST8Plugins[] = L"shared\\eclipse\\plugins";
+const wchar_t kST8Features[] = L"shared\\eclipse\\features";
+const wchar_t kDataPlugins[] = L"workspace\\applications\\eclipse\\plugins";
+const wchar_t kDataFeatures[] = L"workspace\\applications\\eclipse\\features";
+const wchar_t* const kOldRuntime[] = {L"msvcp90.dll", L"msvcr90.dll",
+                                      L"Microsoft.VC90.CRT.manifest"};
+
+std::wstring In(const std::wstring& base, const wchar_t* folder, const wchar_t* name) {
+    return JoinPath(JoinPath(base, folder), name);
+}
+
+// The file holds what InstallSuite put into the suite's file of that name.
+void ExpectFromSuite(const std::wstring& path) {
+    EXPECT_EQ("suite:" + Narrow(path.substr(path.rfind(L'\\') + 1)), ReadFileBytes(path))
+        << Narrow(path);
+}
+
 class SametimeFilesE2E : public SametimeMachine {
 protected:
-    // The old runtime and the feature of a previous install in a layout.
-    void PutInstalledFeature(const std::wstring& native, const std::wstring& plugins,
-                             const std::wstring& features) {
-        for (const wchar_t* name :
-             {kNativeLibrary, L"msvcp90.dll", L"msvcr90.dll", L"Microsoft.VC90.CRT.manifest"}) {
-            Put(In(native, name), "old");
-        }
-        Put(In(plugins, kJar), "old");
-        Put(In(In(features, kFeatureFolder), kFeatureXml), "old");
+    std::wstring MachinePath() const {
+        DWORD type = 0;
+        std::wstring text = RegGetString(HKEY_LOCAL_MACHINE, kEnvironmentKey, L"Path", 0, &type)
+                                .value_or(L"<missing>");
+        EXPECT_EQ(static_cast<DWORD>(REG_EXPAND_SZ), type) << "Path type";
+        return text;
+    }
+    void SetMachinePath(const std::wstring& text) {
+        ASSERT_TRUE(
+            RegPutString(HKEY_LOCAL_MACHINE, kEnvironmentKey, L"Path", text, 0, REG_EXPAND_SZ));
     }
 };
 
-TEST_F(SametimeFilesE2E, CopyFilesToSametimeFillsTheSametime8AndEmbeddedLayouts) {
+TEST_F(SametimeFilesE2E, Sametime8AndEmbeddedLayoutsAreFilledAndCleared) {
     InstallSuite();
     InstallSametime(8);
     InstallNotes8();
-    MakeDirs(In(m_sametime, L"rcp"));
-    MakeDirs(In(m_sametime, L"shared\\eclipse\\plugins"));
-    MakeDirs(In(m_sametime, L"shared\\eclipse\\features"));
-    MakeDirs(In(m_data, L"workspace\\applications\\eclipse\\plugins"));
-    MakeDirs(In(m_data, L"workspace\\applications\\eclipse\\features"));
-    // A running client holds its native library like a loaded library.
-    Put(In(m_sametime, L"rcp\\qmmrvjni.dll"), "running");
-    HeldOpen loaded(In(m_sametime, L"rcp\\qmmrvjni.dll"), FILE_SHARE_READ | FILE_SHARE_DELETE);
-    ASSERT_TRUE(loaded.ok());
+    Put(In(m_sametime, kST8Plugins, L"other.jar"), "other");
+    MakeDirs(JoinPath(m_sametime, kST8Features));
+    MakeDirs(JoinPath(m_data, kDataPlugins));
+    MakeDirs(JoinPath(m_data, kDataFeatures));
+    for (const wchar_t* name : kOldRuntime) {  // left by an older install
+        Put(In(m_sametime, L"rcp", name), "old");
+        Put(In(m_notes, L"native", name), "old");
+    }
+    // A running client holds its native library.
+    Put(In(m_sametime, L"rcp", kNativeLibrary), "running");
+    auto loaded =
+        std::make_unique<HeldOpen>(In(m_sametime, L"rcp", kNativeLibrary), kLikeALoadedLibrary);
+    ASSERT_TRUE(loaded->ok());
     // An entry that merely starts with the suite folder is another folder.
     SetMachinePath(L"%SystemRoot%\\system32;" + m_suite + L"2;");
     SettingChangeListener listener;
     ASSERT_TRUE(listener.ready());
 
     RunResult run = Program().Run(L"-copyfilestosametime");
-
     EXPECT_EQ(0, run.exitCode);
-    EXPECT_FALSE(run.crashed);
-    EXPECT_TRUE(run.HasTraceContaining("Start Copy sametimeplugin files to sametime path!\n"));
     EXPECT_TRUE(run.HasTraceContaining("szSametimePath=" + Narrow(m_sametime)));
     EXPECT_TRUE(run.HasTraceContaining("szEmbeddedSTPath=" + Narrow(m_notes)));
     EXPECT_TRUE(run.HasTraceContaining("End Copy sametimeplugin files to sametime path!\n"));
-    for (const wchar_t* name : {kNativeLibrary, kRuntimeC, kRuntimeCpp}) {
-        EXPECT_EQ(Origin("suite", name), ReadFileBytes(In(In(m_sametime, L"rcp"), name)));
+    for (const std::wstring& path : {
+             In(m_sametime, L"rcp", kNativeLibrary),
+             In(m_sametime, L"rcp", kRuntimeC),
+             In(m_sametime, L"rcp", L"msvcp120.dll"),
+             In(m_sametime, kST8Plugins, kJar),
+             In(m_sametime, kST8Features, kFeatureXml),
+             // Embedded: the library into the Notes program folder, the rest into the data folder.
+             JoinPath(m_notes, kNativeLibrary),
+             In(m_data, kDataPlugins, kJar),
+             In(m_data, kDataFeatures, kFeatureXml),
+         }) {
+        ExpectFromSuite(path);
     }
-    EXPECT_EQ(Origin("suite", kJar),
-              ReadFileBytes(In(In(m_sametime, L"shared\\eclipse\\plugins"), kJar)));
-    EXPECT_EQ(Origin("suite", kFeatureXml),
-              ReadFileBytes(In(In(In(m_sametime, L"shared\\eclipse\\features"), kFeatureFolder),
-                               kFeatureXml)));
-    // The replaced library went aside (and is slated for deletion).
-    EXPECT_EQ(4u, ListDir(In(m_sametime, L"rcp")).size());
-
-    // Embedded: the library into the Notes program folder, the rest into the data folder.
-    EXPECT_EQ(Origin("suite", kNativeLibrary), ReadFileBytes(In(m_notes, kNativeLibrary)));
-    EXPECT_EQ(Origin("suite", kJar),
-              ReadFileBytes(In(In(m_data, L"workspace\\applications\\eclipse\\plugins"), kJar)));
-    EXPECT_EQ(Origin("suite", kFeatureXml),
-              ReadFileBytes(
-                  In(In(In(m_data, L"workspace\\applications\\eclipse\\features"), kFeatureFolder),
-                     kFeatureXml)));
-
-    DWORD type = 0;
-    EXPECT_EQ(L"%SystemRoot%\\system32;" + m_suite + L"2;" + m_suite, MachinePath(&type));
-    EXPECT_EQ(static_cast<DWORD>(REG_EXPAND_SZ), type);
+    // The locked library went aside, untouched: the 3 old and 3 new files and it.
+    EXPECT_EQ(7u, ListDir(JoinPath(m_sametime, L"rcp")).size());
+    EXPECT_EQ("running", loaded->Read());
+    loaded.reset();
+    EXPECT_EQ(L"%SystemRoot%\\system32;" + m_suite + L"2;" + m_suite, MachinePath());
     EXPECT_EQ(1, listener.environmentChanges());
+
+    run = Program().Run(L"-delsametimefiles");
+    EXPECT_EQ(0, run.exitCode);
+    EXPECT_TRUE(run.HasTraceContaining("Delete Mirovan files from Embedded ST Path."));
+    EXPECT_TRUE(run.HasTraceContaining("End Delete sametime plugin Files for QM Uninstall!\n"));
+    // Only what the suite put there goes: the new runtime is shared and stays,
+    // and so does the library set aside (it goes at the next restart).
+    EXPECT_FALSE(FileExists(In(m_sametime, L"rcp", kNativeLibrary)));
+    EXPECT_EQ(3u, ListDir(JoinPath(m_sametime, L"rcp")).size());
+    ExpectFromSuite(In(m_sametime, L"rcp", kRuntimeC));
+    ExpectFromSuite(In(m_sametime, L"rcp", L"msvcp120.dll"));
+    EXPECT_EQ(std::vector<std::wstring>{L"other.jar"}, ListDir(JoinPath(m_sametime, kST8Plugins)));
+    EXPECT_EQ((std::vector<std::wstring>{L"Data", L"native"}), ListDir(m_notes));
+    for (const std::wstring& folder :
+         {JoinPath(m_sametime, kST8Features), JoinPath(m_notes, L"native"),
+          JoinPath(m_data, kDataPlugins), JoinPath(m_data, kDataFeatures)}) {
+        EXPECT_EQ(std::vector<std::wstring>{}, ListDir(folder)) << Narrow(folder);
+    }
+    EXPECT_EQ(L"%SystemRoot%\\system32;" + m_suite + L"2", MachinePath());
 }
 
-TEST_F(SametimeFilesE2E, CopyFilesToSametime7KeepsGoingWithoutARuntime) {
+TEST_F(SametimeFilesE2E, Sametime7LayoutAndAStopAtItsLockedLibrary) {
+    ASSERT_TRUE(RegMakeKey(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Lotus\\Notes\\7.0"));
+    const size_t pending = PendingDeleteCount();
+    // Without Sametime Connect (and Notes below 8) nothing is scheduled.
+    EXPECT_EQ(0, Program().Run(L"-delsametimefilesreboot").exitCode);
+    EXPECT_EQ(pending, PendingDeleteCount());
+
     InstallSuite();
-    DeleteFileW(In(m_suite, kRuntimeC).c_str());
+    DeleteFileW(JoinPath(m_suite, kRuntimeC).c_str());
     InstallSametime(0);  // no version: Sametime 7
     for (const wchar_t* folder : {L"native", L"plugins", L"features"}) {
-        MakeDirs(In(m_sametime, folder));
+        MakeDirs(JoinPath(m_sametime, folder));
     }
     SetMachinePath(L"C:\\A;" + m_suite + L"\\");
-
     RunResult run = Program().Run(L"-copyfilestosametime");
-
     EXPECT_EQ(0, run.exitCode);
     EXPECT_TRUE(run.HasTraceContaining(
         "CQMCommon::CopySametimePluginFiles: CopyFile MSVCR120_DLL Failed!\n"));
     // The C runtime comes first; without it the C++ runtime is not tried.
-    EXPECT_EQ(std::vector<std::wstring>{kNativeLibrary}, ListDir(In(m_sametime, L"native")));
-    EXPECT_EQ(Origin("suite", kJar), ReadFileBytes(In(In(m_sametime, L"plugins"), kJar)));
-    EXPECT_EQ(Origin("suite", kFeatureXml),
-              ReadFileBytes(In(In(In(m_sametime, L"features"), kFeatureFolder), kFeatureXml)));
-    EXPECT_FALSE(DirExists(In(m_sametime, L"rcp")));
-    // Already in the path (with a trailing backslash): unchanged.
-    EXPECT_EQ(L"C:\\A;" + m_suite + L"\\", MachinePath());
+    EXPECT_EQ(std::vector<std::wstring>{kNativeLibrary}, ListDir(JoinPath(m_sametime, L"native")));
+    ExpectFromSuite(In(m_sametime, L"plugins", kJar));
+    ExpectFromSuite(In(m_sametime, L"features", kFeatureXml));
+    EXPECT_FALSE(DirExists(JoinPath(m_sametime, L"rcp")));
+    EXPECT_EQ(L"C:\\A;" + m_suite + L"\\", MachinePath());  // already there: unchanged
+
+    EXPECT_EQ(0, Program().Run(L"-delsametimefilesreboot").exitCode);
+    EXPECT_TRUE(IsPendingDelete(In(m_sametime, L"native", kNativeLibrary)));
+    EXPECT_TRUE(IsPendingDelete(In(m_sametime, L"plugins", kJar)));
+    EXPECT_EQ(pending + 2, PendingDeleteCount());
+
+    HeldOpen locked(In(m_sametime, L"native", kNativeLibrary), FILE_SHARE_READ);
+    ASSERT_TRUE(locked.ok());
+    SetMachinePath(m_suite);
+    run = Program().Run(L"-delsametimefilesEx");
+    EXPECT_EQ(0, run.exitCode);
+    EXPECT_EQ(2u, CountOf(run.TraceText(),
+                          "For disable sametime to delete sametime plugin Files "
+                          "for QM Uninstall!\n"));
+    EXPECT_TRUE(
+        run.HasTraceContaining("CQMCommon::RemoveSametimePluginFiles: DeleteFile Failed!\n"));
+    EXPECT_TRUE(FileExists(In(m_sametime, L"native", kNativeLibrary)));
+    EXPECT_TRUE(FileExists(In(m_sametime, L"plugins", kJar)));
+    EXPECT_TRUE(FileExists(In(m_sametime, L"features", kFeatureXml)));
+    // The path is cleaned all the same, also when the folder is its only entry.
+    EXPECT_EQ(L"", MachinePath());
 }
 
-TEST_F(SametimeFilesE2E, CopyNeverWritesForAFailedLookup) {
+TEST_F(SametimeFilesE2E, CopyNeverWritesForAFailedLookupAndRefreshWritesNothing) {
     // Sametime without a folder, Notes 8 without a program folder: the
     // lookups hand over empty folders, which must not become the drive root.
     InstallSuite();
@@ -107,174 +166,67 @@ TEST_F(SametimeFilesE2E, CopyNeverWritesForAFailedLookup) {
     SetMachinePath(L"C:\\A");
 
     RunResult run = Program().Run(L"-copyfilestosametime");
-
     EXPECT_EQ(0, run.exitCode);
     EXPECT_FALSE(run.crashed);
-    for (const wchar_t* rel : {L"C:\\qmmrvjni.dll", L"C:\\rcp", L"C:\\shared", L"C:\\workspace"}) {
-        EXPECT_FALSE(FileExists(rel) || DirExists(rel)) << Narrow(rel);
+    for (const wchar_t* path : {L"C:\\qmmrvjni.dll", L"C:\\rcp", L"C:\\shared", L"C:\\workspace"}) {
+        EXPECT_FALSE(FileExists(path) || DirExists(path)) << Narrow(path);
     }
     EXPECT_EQ(std::vector<std::wstring>{}, ListDir(m_data));
     EXPECT_EQ(L"C:\\A;" + m_suite, MachinePath());
+
+    // The refresh keyword announces the environment and changes no value.
+    SettingChangeListener listener;
+    ASSERT_TRUE(listener.ready());
+    EXPECT_EQ(0, Program().Run(L"-smsrefreshsysenv").exitCode);
+    EXPECT_EQ(1, listener.environmentChanges());
+    EXPECT_EQ(L"C:\\A;" + m_suite, MachinePath());
 }
 
-TEST_F(SametimeFilesE2E, DelSametimeFilesClearsSametime8AndEmbeddedAndThePath) {
+TEST_F(SametimeFilesE2E, RestartRemovalStampsAndThePerUserCopy) {
     InstallSuite();
     InstallSametime(8);
     InstallNotes8();
-    PutInstalledFeature(In(m_sametime, L"rcp"), In(m_sametime, L"shared\\eclipse\\plugins"),
-                        In(m_sametime, L"shared\\eclipse\\features"));
-    Put(In(m_sametime, L"rcp\\msvcr120.dll"), "runtime");
-    Put(In(m_sametime, L"shared\\eclipse\\plugins\\other.jar"), "other");
-    // Embedded: the library in the program folder, the old runtime in its
-    // "native" folder, the rest in the data folder.
-    PutInstalledFeature(In(m_notes, L"native"),
-                        In(m_data, L"workspace\\applications\\eclipse\\plugins"),
-                        In(m_data, L"workspace\\applications\\eclipse\\features"));
-    MoveFileW(In(m_notes, L"native\\qmmrvjni.dll").c_str(), In(m_notes, kNativeLibrary).c_str());
-    SetMachinePath(L"C:\\A;" + m_suite + L"2;" + m_suite + L";%ProgramFiles%\\B");
-
-    RunResult run = Program().Run(L"-delsametimefiles");
-
-    EXPECT_EQ(0, run.exitCode);
-    EXPECT_TRUE(run.HasTraceContaining("Start Delete sametime plugin Files for QM Uninstall!\n"));
-    EXPECT_TRUE(run.HasTraceContaining("Delete Mirovan files from Embedded ST Path."));
-    EXPECT_TRUE(run.HasTraceContaining("End Delete sametime plugin Files for QM Uninstall!\n"));
-    // Only what the suite put there goes; the new runtime is shared and stays.
-    EXPECT_EQ(std::vector<std::wstring>{L"msvcr120.dll"}, ListDir(In(m_sametime, L"rcp")));
-    EXPECT_EQ(std::vector<std::wstring>{L"other.jar"},
-              ListDir(In(m_sametime, L"shared\\eclipse\\plugins")));
-    EXPECT_EQ(std::vector<std::wstring>{}, ListDir(In(m_sametime, L"shared\\eclipse\\features")));
-    EXPECT_EQ((std::vector<std::wstring>{L"Data", L"native"}), ListDir(m_notes));
-    EXPECT_EQ(std::vector<std::wstring>{}, ListDir(In(m_notes, L"native")));
-    EXPECT_EQ(std::vector<std::wstring>{},
-              ListDir(In(m_data, L"workspace\\applications\\eclipse\\plugins")));
-    EXPECT_EQ(std::vector<std::wstring>{},
-              ListDir(In(m_data, L"workspace\\applications\\eclipse\\features")));
-    DWORD type = 0;
-    EXPECT_EQ(L"C:\\A;" + m_suite + L"2;%ProgramFiles%\\B", MachinePath(&type));
-    EXPECT_EQ(static_cast<DWORD>(REG_EXPAND_SZ), type);
-}
-
-TEST_F(SametimeFilesE2E, DelSametimeFilesExStopsAtALockedSametime7Library) {
-    InstallSuite();
-    InstallSametime(7);
-    PutInstalledFeature(In(m_sametime, L"native"), In(m_sametime, L"plugins"),
-                        In(m_sametime, L"features"));
-    HeldOpen locked(In(m_sametime, L"native\\qmmrvjni.dll"), FILE_SHARE_READ);
-    ASSERT_TRUE(locked.ok());
-    SetMachinePath(m_suite);
-
-    RunResult run = Program().Run(L"-delsametimefilesEx");
-
-    EXPECT_EQ(0, run.exitCode);
-    const std::string start =
-        "For disable sametime to delete sametime plugin Files for QM Uninstall!\n";
-    EXPECT_EQ(2, static_cast<int>(CountOf(run.TraceText(), start)));
-    EXPECT_TRUE(
-        run.HasTraceContaining("CQMCommon::RemoveSametimePluginFiles: DeleteFile Failed!\n"));
-    EXPECT_EQ(4u, ListDir(In(m_sametime, L"native")).size());
-    EXPECT_TRUE(FileExists(In(In(m_sametime, L"plugins"), kJar)));
-    EXPECT_TRUE(FileExists(In(In(In(m_sametime, L"features"), kFeatureFolder), kFeatureXml)));
-    // The path is cleaned all the same, also when the folder is its only entry.
-    EXPECT_EQ(L"", MachinePath());
-}
-
-TEST_F(SametimeFilesE2E, DelSametimeFilesRebootSchedulesEveryLayout) {
-    InstallSametime(8);
-    InstallNotes8();
-    const size_t before = PendingDeleteCount();
-
-    RunResult run = Program().Run(L"-delsametimefilesreboot");
-
-    EXPECT_EQ(0, run.exitCode);
-    EXPECT_TRUE(run.HasTraceContaining(
-        "For silent install Start Delete sametime files after pc restart!\n"));
-    EXPECT_TRUE(
-        run.HasTraceContaining("For silent install Delete sametime files after pc restart!\n"));
-    const std::wstring stFeatures =
-        In(In(m_sametime, L"shared\\eclipse\\features"), kFeatureFolder);
-    const std::wstring dataFeatures =
-        In(In(m_data, L"workspace\\applications\\eclipse\\features"), kFeatureFolder);
+    const size_t pending = PendingDeleteCount();
+    EXPECT_EQ(0, Program().Run(L"-delsametimefilesreboot").exitCode);
+    const std::wstring stFeature = In(m_sametime, kST8Features, kFeatureXml);
+    const std::wstring dataFeature = In(m_data, kDataFeatures, kFeatureXml);
     for (const std::wstring& path : {
-             In(m_notes, kNativeLibrary),
-             In(In(m_data, L"workspace\\applications\\eclipse\\plugins"), kJar),
-             In(dataFeatures, kFeatureXml),
-             dataFeatures,
-             In(In(m_sametime, L"rcp"), kNativeLibrary),
-             In(In(m_sametime, L"shared\\eclipse\\plugins"), kJar),
-             In(stFeatures, kFeatureXml),
-             stFeatures,
+             JoinPath(m_notes, kNativeLibrary),
+             In(m_data, kDataPlugins, kJar),
+             dataFeature,
+             dataFeature.substr(0, dataFeature.rfind(L'\\')),
+             In(m_sametime, L"rcp", kNativeLibrary),
+             In(m_sametime, kST8Plugins, kJar),
+             stFeature,
+             stFeature.substr(0, stFeature.rfind(L'\\')),
          }) {
         EXPECT_TRUE(IsPendingDelete(path)) << Narrow(path);
     }
-    EXPECT_EQ(before + 8, PendingDeleteCount());
-}
+    EXPECT_EQ(pending + 8, PendingDeleteCount());
 
-TEST_F(SametimeFilesE2E, DelSametimeFilesRebootForSametime7AndNothingElse) {
-    InstallSametime(7);
-    ASSERT_TRUE(RegMakeKey(HKEY_LOCAL_MACHINE, kNotes7Key));
-    const size_t before = PendingDeleteCount();
-
-    RunResult run = Program().Run(L"-delsametimefilesreboot");
-
-    EXPECT_EQ(0, run.exitCode);
-    EXPECT_TRUE(IsPendingDelete(In(In(m_sametime, L"native"), kNativeLibrary)));
-    EXPECT_TRUE(IsPendingDelete(In(In(m_sametime, L"plugins"), kJar)));
-    EXPECT_EQ(before + 2, PendingDeleteCount());
-}
-
-TEST_F(SametimeFilesE2E, StampsAreResetForSametimeAndTheNotesData) {
-    InstallSuite();
-    InstallSametime(8);
-    InstallNotes8();
-    const std::wstring stConfig = In(m_sametime, L"configuration\\org.eclipse.update");
-    const std::wstring dataConfig = In(m_data, L"configuration\\org.eclipse.update");
-    Put(In(stConfig, L"last.config.stamp"), "st-new");
-    Put(In(stConfig, L"last.config.stamp.bak"), "st-old");
-    Put(In(dataConfig, L"last.config.stamp"), "data-new");
-
+    const std::wstring stConfig = JoinPath(m_sametime, L"configuration\\org.eclipse.update");
+    const std::wstring dataConfig = JoinPath(m_data, L"configuration\\org.eclipse.update");
+    Put(JoinPath(stConfig, L"last.config.stamp"), "st-new");
+    Put(JoinPath(stConfig, L"last.config.stamp.bak"), "st-old");
+    Put(JoinPath(dataConfig, L"last.config.stamp"), "data-new");
     RunResult run = Program().Run(L"-delsametimestampfile");
-
     EXPECT_EQ(0, run.exitCode);
-    EXPECT_TRUE(run.HasTraceContaining(
-        "Start Delete sametime last.config.stamp file for sametime install!\n"));
     EXPECT_TRUE(run.HasTraceContaining(
         "End Delete sametime last.config.stamp file for sametime install!\n"));
     EXPECT_EQ(std::vector<std::wstring>{L"last.config.stamp.bak"}, ListDir(stConfig));
-    EXPECT_EQ("st-new", ReadFileBytes(In(stConfig, L"last.config.stamp.bak")));
-    EXPECT_EQ("data-new", ReadFileBytes(In(dataConfig, L"last.config.stamp.bak")));
+    EXPECT_EQ("st-new", ReadFileBytes(JoinPath(stConfig, L"last.config.stamp.bak")));
+    EXPECT_EQ("data-new", ReadFileBytes(JoinPath(dataConfig, L"last.config.stamp.bak")));
 
     // The per-user install: the data folder's feature files and its stamp again.
-    MakeDirs(In(m_data, L"workspace\\applications\\eclipse\\plugins"));
-    MakeDirs(In(m_data, L"workspace\\applications\\eclipse\\features"));
-    Put(In(dataConfig, L"last.config.stamp"), "data-newer");
-    run = Program().Run(L"-smsinstallsametimeex");
-
-    EXPECT_EQ(0, run.exitCode);
-    EXPECT_TRUE(
-        run.HasTraceContaining("smsinstallsametimeex, execute some operator for current user!\n"));
-    EXPECT_EQ(Origin("suite", kJar),
-              ReadFileBytes(In(In(m_data, L"workspace\\applications\\eclipse\\plugins"), kJar)));
-    EXPECT_EQ(Origin("suite", kFeatureXml),
-              ReadFileBytes(
-                  In(In(In(m_data, L"workspace\\applications\\eclipse\\features"), kFeatureFolder),
-                     kFeatureXml)));
-    EXPECT_FALSE(FileExists(In(m_notes, kNativeLibrary)));  // the program folder is not touched
-    EXPECT_EQ("data-newer", ReadFileBytes(In(dataConfig, L"last.config.stamp.bak")));
+    MakeDirs(JoinPath(m_data, kDataPlugins));
+    MakeDirs(JoinPath(m_data, kDataFeatures));
+    Put(JoinPath(dataConfig, L"last.config.stamp"), "data-newer");
+    EXPECT_EQ(0, Program().Run(L"-smsinstallsametimeex").exitCode);
+    ExpectFromSuite(In(m_data, kDataPlugins, kJar));
+    ExpectFromSuite(dataFeature);
+    EXPECT_FALSE(FileExists(JoinPath(m_notes, kNativeLibrary)));  // not the program folder
     EXPECT_EQ(std::vector<std::wstring>{L"last.config.stamp.bak"}, ListDir(dataConfig));
-}
-
-TEST_F(SametimeFilesE2E, SmsRefreshSysEnvAnnouncesAndChangesNothing) {
-    SetMachinePath(L"%SystemRoot%;C:\\A;");
-    SettingChangeListener listener;
-    ASSERT_TRUE(listener.ready());
-
-    RunResult run = Program().Run(L"-smsrefreshsysenv");
-
-    EXPECT_EQ(0, run.exitCode);
-    EXPECT_TRUE(run.HasTraceContaining("qmmirovanoni.exe: Call smsrefreshsysenv.\n"));
-    EXPECT_EQ(1, listener.environmentChanges());
-    EXPECT_EQ(L"%SystemRoot%;C:\\A;", MachinePath());
+    EXPECT_EQ("data-newer", ReadFileBytes(JoinPath(dataConfig, L"last.config.stamp.bak")));
 }
 
 }  // namespace

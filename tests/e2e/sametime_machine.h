@@ -17,19 +17,14 @@
 
 namespace sametime_test {
 
-const wchar_t kSuiteKey[] = L"SOFTWARE\\Mirovan\\QmkTools";
-const wchar_t kNotes7Key[] = L"SOFTWARE\\Lotus\\Notes\\7.0";
 const wchar_t kNotes8Key[] = L"SOFTWARE\\Lotus\\Notes\\8.0";
 const wchar_t kUninstallEntry[] =
     L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\QMTestSametimeConnect";
 
 const wchar_t kNativeLibrary[] = L"qmmrvjni.dll";
 const wchar_t kRuntimeC[] = L"msvcr120.dll";
-const wchar_t kRuntimeCpp[] = L"msvcp120.dll";
 const wchar_t kJar[] = L"com.mrv.realtime.meeting_1.0.1.jar";
-const wchar_t kFeatureXml[] = L"feature.xml";
-const wchar_t kFeatureFolder[] = L"com.mrv.realtime.meeting.feature_1.0.1";
-const wchar_t* const kSuiteFiles[] = {kNativeLibrary, kRuntimeC, kRuntimeCpp, kJar, kFeatureXml};
+const wchar_t kFeatureXml[] = L"com.mrv.realtime.meeting.feature_1.0.1\\feature.xml";
 
 // The feature element as the program writes it (attributes in this order).
 const char kFeatureElement[] =
@@ -42,11 +37,10 @@ const char kFeatureId[] = "id=\"com.mrv.realtime.meeting.feature\"";
 inline std::string PlatformXml(const std::string& siteUrl, const std::string& features = "") {
     return "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
            "<config date=\"1300000000000\" transient=\"false\" version=\"3.0\">\n"
-           "<site enabled=\"true\" policy=\"USER-EXCLUDE\" updateable=\"true\" "
-           "url=\"platform:/base/\">\n"
+           "<site enabled=\"true\" url=\"platform:/base/\">\n"
            "<feature id=\"org.eclipse.rcp\" url=\"features/org.eclipse.rcp_3.4.0/\" "
            "version=\"3.4.0\">\n</feature>\n</site>\n"
-           "<site enabled=\"true\" policy=\"USER-EXCLUDE\" updateable=\"true\" url=\"" +
+           "<site enabled=\"true\" url=\"" +
            siteUrl +
            "\">\n<feature id=\"com.example.chat\" url=\"features/com.example.chat_8.0.0/\" "
            "version=\"8.0.0\">\n</feature>\n" +
@@ -61,24 +55,16 @@ inline size_t CountOf(const std::string& text, const std::string& part) {
     return count;
 }
 
-inline std::string Origin(const char* place, const wchar_t* name) {
-    return std::string(place) + ":" + Narrow(name);
-}
-
 class SametimeMachine : public MachineTest {
 protected:
-    SametimeMachine()
-        : m_suite(m_scratch.Sub(L"Quillmark Tools", true)),
-          m_sametime(m_scratch.Sub(L"Sametime Connect", true)),
-          m_notes(m_scratch.Sub(L"Notes", true)),
-          m_data(m_scratch.Sub(L"Notes\\Data", true)) {}
-
-    // The suite folder with the feature's files, each naming its origin.
+    // The suite folder with the feature's files, each holding "suite:<name>".
     void InstallSuite() {
-        for (const wchar_t* name : kSuiteFiles) {
-            ASSERT_TRUE(WriteFileBytes(JoinPath(m_suite, name), Origin("suite", name)));
+        for (const wchar_t* name :
+             {kNativeLibrary, kRuntimeC, L"msvcp120.dll", kJar, L"feature.xml"}) {
+            Put(JoinPath(m_suite, name), "suite:" + Narrow(name));
         }
-        ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, kSuiteKey, L"Path", m_suite));
+        ASSERT_TRUE(
+            RegPutString(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Mirovan\\QmkTools", L"Path", m_suite));
     }
     // Sametime Connect of the given major version (0: no version value).
     void InstallSametime(DWORD version, const std::wstring& location) {
@@ -91,43 +77,18 @@ protected:
         }
     }
     void InstallSametime(DWORD version) { InstallSametime(version, m_sametime); }
-    // Notes 8 with its program and data folders.
     void InstallNotes8() {
         ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, kNotes8Key, L"Path", m_notes));
         ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, kNotes8Key, L"DataPath", m_data));
     }
-
     void Put(const std::wstring& path, const std::string& content) {
         ASSERT_TRUE(WriteFileBytes(path, content));
     }
-    std::wstring In(const std::wstring& folder, const std::wstring& rel) const {
-        return JoinPath(folder, rel);
-    }
 
-    // The per-user Sametime 8 configuration files: profile 0 under "Lotus",
-    // profile 1 under "IBM".
-    static std::wstring ProfileFolder(int profile) {
-        return JoinPath(RoamingAppData(), profile == 0
-                                              ? L"Lotus\\Sametime\\.config\\org.eclipse.update"
-                                              : L"IBM\\Sametime\\.config\\org.eclipse.update");
-    }
-    static std::wstring ProfileConfig(int profile) {
-        return JoinPath(ProfileFolder(profile), L"platform.xml");
-    }
-
-    std::wstring MachinePath(DWORD* type = nullptr) const {
-        return RegGetString(HKEY_LOCAL_MACHINE, kEnvironmentKey, L"Path", 0, type)
-            .value_or(L"<missing>");
-    }
-    void SetMachinePath(const std::wstring& text) {
-        ASSERT_TRUE(
-            RegPutString(HKEY_LOCAL_MACHINE, kEnvironmentKey, L"Path", text, 0, REG_EXPAND_SZ));
-    }
-
-    std::wstring m_suite;
-    std::wstring m_sametime;
-    std::wstring m_notes;
-    std::wstring m_data;
+    const std::wstring m_suite = m_scratch.Sub(L"Quillmark Tools", true);
+    const std::wstring m_sametime = m_scratch.Sub(L"Sametime Connect", true);
+    const std::wstring m_notes = m_scratch.Sub(L"Notes", true);
+    const std::wstring m_data = m_scratch.Sub(L"Notes\\Data", true);
 };
 
 }  // namespace sametime_test

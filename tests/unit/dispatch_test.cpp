@@ -6,7 +6,6 @@
 #include <set>
 #include <string>
 
-#include "app/cmdline_parser.h"
 #include "app/maintenance_keywords.h"
 #include "app/ni_handle.h"
 #include "app/ui_language.h"
@@ -68,29 +67,6 @@ TEST(KeywordScan, RestAfterTheFirstDelimiter) {
     EXPECT_EQ(nullptr, FindMaintenanceKeyword(L"copyfilestonotes"));
     EXPECT_EQ(nullptr, FindMaintenanceKeyword(L""));
     EXPECT_EQ(nullptr, FindMaintenanceKeyword(nullptr));
-}
-
-TEST(ActionTable, NamesAreExactAndNumbered) {
-    EXPECT_EQ(1, ActionNumberFromName(L"PPU"));
-    EXPECT_EQ(2, ActionNumberFromName(L"UPLOAD_FILE"));
-    EXPECT_EQ(3, ActionNumberFromName(L"StartOCMeeting"));
-    EXPECT_EQ(4, ActionNumberFromName(L"OpenQMSetting"));
-    EXPECT_EQ(5, ActionNumberFromName(L"PostAttendee"));
-    EXPECT_EQ(6, ActionNumberFromName(L"ShareAsApp"));
-    EXPECT_EQ(8, ActionNumberFromName(L"CommonLogin"));
-    EXPECT_EQ(9, ActionNumberFromName(L"ShareWindow"));
-    EXPECT_EQ(10, ActionNumberFromName(L"StartAudioOnly"));
-    EXPECT_EQ(11, ActionNumberFromName(L"StartScheduledMeeting"));
-    EXPECT_EQ(12, ActionNumberFromName(L"ScheduleMeeting"));
-    EXPECT_EQ(13, ActionNumberFromName(L"JoinMeeting"));
-    EXPECT_EQ(14, ActionNumberFromName(L"OpenHelp"));
-    EXPECT_EQ(15, ActionNumberFromName(L"OpenAbout"));
-    EXPECT_EQ(16, ActionNumberFromName(L"PostJMFLog"));
-    EXPECT_EQ(17, ActionNumberFromName(L"SendProblemReport"));
-    EXPECT_EQ(0, ActionNumberFromName(L"joinmeeting"));
-    EXPECT_EQ(0, ActionNumberFromName(L"JoinMeeting "));
-    EXPECT_EQ(0, ActionNumberFromName(L""));
-    EXPECT_EQ(0, ActionNumberFromName(nullptr));
 }
 
 TEST(UILanguage, CodesMapToTheirLangIds) {

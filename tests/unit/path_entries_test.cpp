@@ -4,72 +4,60 @@
 #include <string>
 
 #include "cleanup/path_entries.h"
+#include "tests/support/file_util.h"
 
 namespace {
 
-std::wstring Added(const wchar_t* list, const wchar_t* folder) {
-    return AppendPathEntry(list, folder).c_str();
-}
+struct EntryCase {
+    const wchar_t* list;
+    const wchar_t* folder;
+    bool listed;
+    const wchar_t* removed;  // the list without the folder's entries
+    int removedCount;
+};
 
-std::wstring Removed(const wchar_t* list, const wchar_t* folder, int* count = nullptr) {
-    return RemovePathEntries(list, folder, count).c_str();
+TEST(PathEntries, RemovesWholeEntriesAndKeepsTheRestAsWritten) {
+    const EntryCase cases[] = {
+        {L"C:\\A;C:\\Suite\\qmtools;C:\\B", L"C:\\Suite\\qmtools\\", true, L"C:\\A;C:\\B", 1},
+        {L"C:\\Suite\\qmtools;C:\\B", L"C:\\Suite\\qmtools", true, L"C:\\B", 1},
+        {L"C:\\A;C:\\Suite\\qmtools;", L"C:\\Suite\\qmtools", true, L"C:\\A", 1},
+        {L"C:\\Suite\\qmtools", L"C:\\Suite\\qmtools", true, L"", 1},
+        // Longer entries that merely contain the folder's text are other folders
+        // (text replacement would leave "C:\A2;C:\B" for the first).
+        {L"C:\\A;C:\\Suite\\qm2;C:\\B", L"C:\\Suite\\qm", false, L"C:\\A;C:\\Suite\\qm2;C:\\B", 0},
+        {L"D:\\x\\C:\\Suite\\qm;C:\\Suite\\qm.old", L"C:\\Suite\\qm", false,
+         L"D:\\x\\C:\\Suite\\qm;C:\\Suite\\qm.old", 0},
+        // Case and trailing backslashes do not matter.
+        {L"C:\\A;c:\\SUITE\\qm\\\\;C:\\B;C:\\Suite\\qm", L"C:\\Suite\\qm", true, L"C:\\A;C:\\B", 2},
+        {L"C:\\Suite\\qm", L"c:\\SUITE\\qm\\", true, L"", 1},
+        {L"%SystemRoot%\\system32; C:\\Spaced ;;%ProgramFiles%\\Tool\\;C:\\Suite\\qm",
+         L"C:\\Suite\\qm", true, L"%SystemRoot%\\system32; C:\\Spaced ;;%ProgramFiles%\\Tool\\", 1},
+        // An empty folder names no entry, empty ones included.
+        {L"C:\\A;;C:\\B", L"", false, L"C:\\A;;C:\\B", 0},
+        {L"C:\\A;\\;C:\\B", L"\\", false, L"C:\\A;\\;C:\\B", 0},
+    };
+    for (const EntryCase& c : cases) {
+        SCOPED_TRACE(Narrow(c.list) + " - " + Narrow(c.folder));
+        EXPECT_EQ(c.listed, PathListHasEntry(c.list, c.folder));
+        int count = -1;
+        EXPECT_EQ(std::wstring(c.removed), RemovePathEntries(c.list, c.folder, &count).c_str());
+        EXPECT_EQ(c.removedCount, count);
+    }
 }
 
 TEST(PathEntries, AppendsTheFolderWithoutItsTrailingBackslash) {
-    EXPECT_EQ(L"C:\\Windows\\system32;C:\\Windows;C:\\Suite\\qmtools",
-              Added(L"C:\\Windows\\system32;C:\\Windows", L"C:\\Suite\\qmtools\\"));
-    EXPECT_EQ(L"C:\\A;C:\\Suite", Added(L"C:\\A;;", L"C:\\Suite"));
-    EXPECT_EQ(L"C:\\Suite", Added(L"", L"C:\\Suite"));
-}
-
-TEST(PathEntries, RemovesTheFolderBetweenOthers) {
-    int count = 0;
-    EXPECT_EQ(L"C:\\A;C:\\B",
-              Removed(L"C:\\A;C:\\Suite\\qmtools;C:\\B", L"C:\\Suite\\qmtools\\", &count));
-    EXPECT_EQ(1, count);
-    EXPECT_EQ(L"C:\\B", Removed(L"C:\\Suite\\qmtools;C:\\B", L"C:\\Suite\\qmtools"));
-    EXPECT_EQ(L"C:\\A", Removed(L"C:\\A;C:\\Suite\\qmtools;", L"C:\\Suite\\qmtools"));
-}
-
-TEST(PathEntries, AnEntryThatOnlyContainsTheFolderIsAnotherFolder) {
-    // Text replacement would leave "C:\A2;C:\B" here.
-    EXPECT_EQ(L"C:\\A;C:\\Suite\\qm2;C:\\B",
-              Removed(L"C:\\A;C:\\Suite\\qm2;C:\\B", L"C:\\Suite\\qm"));
-    EXPECT_EQ(L"D:\\x\\C:\\Suite\\qm;C:\\Suite\\qm.old",
-              Removed(L"D:\\x\\C:\\Suite\\qm;C:\\Suite\\qm.old", L"C:\\Suite\\qm"));
-    EXPECT_FALSE(PathListHasEntry(L"C:\\A;C:\\Suite\\qm2;C:\\B", L"C:\\Suite\\qm"));
-    EXPECT_EQ(L"C:\\A;C:\\Suite\\qm2;C:\\Suite\\qm",
-              Added(L"C:\\A;C:\\Suite\\qm2", L"C:\\Suite\\qm"));
-}
-
-TEST(PathEntries, MatchesWithoutRegardToCaseOrTrailingBackslashes) {
-    EXPECT_TRUE(PathListHasEntry(L"C:\\A;c:\\suite\\QM\\\\;C:\\B", L"C:\\Suite\\qm"));
-    EXPECT_TRUE(PathListHasEntry(L"C:\\Suite\\qm", L"c:\\SUITE\\qm\\"));
-    int count = 0;
-    EXPECT_EQ(L"C:\\A;C:\\B",
-              Removed(L"C:\\A;c:\\SUITE\\qm\\;C:\\B;C:\\Suite\\qm", L"C:\\Suite\\qm", &count));
-    EXPECT_EQ(2, count);
-}
-
-TEST(PathEntries, KeepsEveryOtherEntryAsWritten) {
-    const wchar_t* list =
-        L"%SystemRoot%\\system32; C:\\Spaced ;;%ProgramFiles%\\Tool\\;C:\\Suite\\qm";
-    EXPECT_EQ(L"%SystemRoot%\\system32; C:\\Spaced ;;%ProgramFiles%\\Tool\\",
-              Removed(list, L"C:\\Suite\\qm"));
-    EXPECT_EQ(L"%SystemRoot%\\system32;%windir%;C:\\Suite\\qm",
-              Added(L"%SystemRoot%\\system32;%windir%", L"C:\\Suite\\qm"));
-}
-
-TEST(PathEntries, TheOnlyEntryIsRemovedToo) {
-    int count = 0;
-    EXPECT_EQ(L"", Removed(L"C:\\Suite\\qmtools", L"C:\\Suite\\qmtools", &count));
-    EXPECT_EQ(1, count);
-}
-
-TEST(PathEntries, NothingMatchesAnEmptyFolder) {
-    EXPECT_FALSE(PathListHasEntry(L"C:\\A;;C:\\B", L""));
-    EXPECT_FALSE(PathListHasEntry(L"C:\\A;\\;C:\\B", L"\\"));
-    EXPECT_EQ(L"C:\\A;;C:\\B", Removed(L"C:\\A;;C:\\B", L"\\"));
+    const wchar_t* const cases[][3] = {
+        {L"C:\\Windows\\system32;C:\\Windows", L"C:\\Suite\\qmtools\\",
+         L"C:\\Windows\\system32;C:\\Windows;C:\\Suite\\qmtools"},
+        {L"C:\\A;;", L"C:\\Suite", L"C:\\A;C:\\Suite"},
+        {L"", L"C:\\Suite", L"C:\\Suite"},
+        {L"C:\\A;C:\\Suite\\qm2", L"C:\\Suite\\qm", L"C:\\A;C:\\Suite\\qm2;C:\\Suite\\qm"},
+        {L"%SystemRoot%\\system32;%windir%", L"C:\\Suite\\qm",
+         L"%SystemRoot%\\system32;%windir%;C:\\Suite\\qm"},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(std::wstring(c[2]), AppendPathEntry(c[0], c[1]).c_str()) << Narrow(c[0]);
+    }
 }
 
 TEST(PathEntries, HandlesALongPath) {
@@ -77,10 +65,10 @@ TEST(PathEntries, HandlesALongPath) {
     for (int i = 0; i < 1500; ++i) {
         list += L"C:\\Tools\\entry" + std::to_wstring(i) + L";";
     }
+    const std::wstring before = list.substr(0, list.size() - 1);
     list += L"C:\\Suite\\qm";
     EXPECT_TRUE(PathListHasEntry(list.c_str(), L"C:\\Suite\\qm"));
-    std::wstring expected = list.substr(0, list.size() - wcslen(L";C:\\Suite\\qm"));
-    EXPECT_EQ(expected, Removed(list.c_str(), L"C:\\Suite\\qm"));
+    EXPECT_EQ(before, RemovePathEntries(list.c_str(), L"C:\\Suite\\qm").c_str());
 }
 
 }  // namespace

@@ -1,7 +1,5 @@
-// Scratch registry keys for unit tests: a uniquely named key below a parent
-// such as HKCU\Software or HKLM\SOFTWARE, removed in both registry views when
-// the test ends, after any restrictive security a test put on its keys has
-// been lifted again.
+// Scratch registry state for unit tests: uniquely named keys, removed in both
+// views at the end, and saved trees loaded as hives under HKEY_USERS.
 #pragma once
 
 #include <windows.h>
@@ -12,26 +10,21 @@
 
 #include "tests/support/registry_util.h"
 
-namespace scratch_registry {
-
-inline std::wstring UniqueName(const wchar_t* tag) {
+inline std::wstring UniqueRegName(const wchar_t* tag) {
     static unsigned counter = 0;
-    wchar_t name[96];
-    _snwprintf(name, 96, L"QMTest-%s-%lu-%lu-%u", tag, GetCurrentProcessId(), GetTickCount(),
-               ++counter);
-    name[95] = L'\0';
-    return name;
+    return L"QMTest-" + std::wstring(tag) + L"-" + std::to_wstring(GetCurrentProcessId()) + L"-" +
+           std::to_wstring(GetTickCount()) + L"-" + std::to_wstring(++counter);
 }
 
-// Puts the security descriptor `sddl` (its DACL) on root\key; true when set.
-inline bool SetKeyDacl(HKEY root, const std::wstring& key, const wchar_t* sddl, REGSAM view = 0) {
+// Puts the DACL of `sddl` on root\key; true when set.
+inline bool SetKeyDacl(HKEY root, const std::wstring& key, const wchar_t* sddl) {
     PSECURITY_DESCRIPTOR descriptor = nullptr;
     if (!ConvertStringSecurityDescriptorToSecurityDescriptorW(sddl, SDDL_REVISION_1, &descriptor,
                                                               nullptr)) {
         return false;
     }
     HKEY handle = nullptr;
-    bool ok = RegOpenKeyExW(root, key.c_str(), 0, WRITE_DAC | view, &handle) == ERROR_SUCCESS;
+    bool ok = RegOpenKeyExW(root, key.c_str(), 0, WRITE_DAC, &handle) == ERROR_SUCCESS;
     if (ok) {
         ok = RegSetKeySecurity(handle, DACL_SECURITY_INFORMATION, descriptor) == ERROR_SUCCESS;
         RegCloseKey(handle);
@@ -40,56 +33,89 @@ inline bool SetKeyDacl(HKEY root, const std::wstring& key, const wchar_t* sddl, 
     return ok;
 }
 
-// Read-only for everyone: opening for writing or deleting is refused.
-constexpr const wchar_t kReadOnlyDacl[] = L"D:P(A;;KR;;;WD)";
-// Everything but DELETE.
-constexpr const wchar_t kNoDeleteDacl[] = L"D:P(D;;SD;;;WD)(A;;KA;;;WD)";
-constexpr const wchar_t kFullAccessDacl[] = L"D:P(A;;KA;;;WD)";
+constexpr wchar_t kReadOnlyDacl[] = L"D:P(A;;KR;;;WD)";
+constexpr wchar_t kNoDeleteDacl[] = L"D:P(D;;SD;;;WD)(A;;KA;;;WD)";  // all but DELETE
+constexpr wchar_t kFullAccessDacl[] = L"D:P(A;;KA;;;WD)";
 
-}  // namespace scratch_registry
-
+// parent\QMTest-tag-..., created in view 0.
 class ScratchKey {
 public:
-    // parent\QMTest-tag-..., created in each of the given views.
-    ScratchKey(HKEY root, const std::wstring& parent, const wchar_t* tag,
-               std::vector<REGSAM> views = {0})
-        : m_root(root),
-          m_path(parent + L"\\" + scratch_registry::UniqueName(tag)),
-          m_views(std::move(views)) {
-        for (REGSAM view : m_views) {
-            RegMakeKey(m_root, m_path, view);
-        }
+    ScratchKey(HKEY root, const std::wstring& parent, const wchar_t* tag)
+        : m_root(root), m_path(parent + L"\\" + UniqueRegName(tag)) {
+        RegMakeKey(m_root, m_path);
     }
     ~ScratchKey() {
-        for (const Restricted& r : m_restricted) {
-            scratch_registry::SetKeyDacl(m_root, r.key, scratch_registry::kFullAccessDacl, r.view);
+        for (const std::wstring& key : m_restricted) {
+            SetKeyDacl(m_root, key, kFullAccessDacl);
         }
-        for (REGSAM view : {REGSAM(0), REGSAM(KEY_WOW64_64KEY)}) {
-            RegRemoveTree(m_root, m_path, view);
-        }
+        RegRemoveTree(m_root, m_path, 0);
+        RegRemoveTree(m_root, m_path, KEY_WOW64_64KEY);
     }
     ScratchKey(const ScratchKey&) = delete;
     ScratchKey& operator=(const ScratchKey&) = delete;
 
-    HKEY root() const { return m_root; }
     const std::wstring& path() const { return m_path; }
-    // path\rel
     std::wstring Sub(const std::wstring& rel) const { return m_path + L"\\" + rel; }
-
-    // Puts a DACL on path\rel, lifted again before the removal.
-    bool Restrict(const std::wstring& rel, const wchar_t* sddl, REGSAM view = 0) {
-        std::wstring key = rel.empty() ? m_path : Sub(rel);
-        m_restricted.push_back({key, view});
-        return scratch_registry::SetKeyDacl(m_root, key, sddl, view);
+    // Puts a DACL on path\rel (rel may be empty), lifted again before removal.
+    bool Restrict(const std::wstring& rel, const wchar_t* sddl) {
+        m_restricted.push_back(rel.empty() ? m_path : Sub(rel));
+        return SetKeyDacl(m_root, m_restricted.back(), sddl);
     }
 
 private:
-    struct Restricted {
-        std::wstring key;
-        REGSAM view;
-    };
     HKEY m_root;
     std::wstring m_path;
-    std::vector<REGSAM> m_views;
-    std::vector<Restricted> m_restricted;
+    std::vector<std::wstring> m_restricted;
+};
+
+// Another user's NTUSER.DAT: a scratch tree with the given string values,
+// saved with RegSaveKeyW and loaded as HKEY_USERS\<name> (the caller holds the
+// backup and restore privileges); unloaded and its file deleted at the end.
+class LoadedHive {
+public:
+    struct Value {
+        std::wstring key;
+        const wchar_t* name;
+        const wchar_t* text;
+    };
+    explicit LoadedHive(const std::vector<Value>& values) : m_name(UniqueRegName(L"hive")) {
+        wchar_t temp[MAX_PATH] = {};
+        GetTempPathW(MAX_PATH, temp);
+        m_file = temp + m_name + L".dat";
+        ScratchKey source(HKEY_CURRENT_USER, L"Software", L"hivesrc");
+        for (const Value& value : values) {
+            RegPutString(HKEY_CURRENT_USER, source.Sub(value.key), value.name, value.text);
+        }
+        HKEY key = nullptr;
+        if (RegOpenKeyExW(HKEY_CURRENT_USER, source.path().c_str(), 0, KEY_READ, &key) ==
+            ERROR_SUCCESS) {
+            m_saved = RegSaveKeyW(key, m_file.c_str(), nullptr);
+            RegCloseKey(key);
+        }
+        if (m_saved == ERROR_SUCCESS) {
+            m_loaded = RegLoadKeyW(HKEY_USERS, m_name.c_str(), m_file.c_str());
+        }
+    }
+    ~LoadedHive() {
+        if (m_loaded == ERROR_SUCCESS) {
+            RegUnLoadKeyW(HKEY_USERS, m_name.c_str());
+        }
+        DeleteFileW(m_file.c_str());
+    }
+    LoadedHive(const LoadedHive&) = delete;
+    LoadedHive& operator=(const LoadedHive&) = delete;
+
+    bool ok() const { return m_saved == ERROR_SUCCESS && m_loaded == ERROR_SUCCESS; }
+    std::string error() const {
+        return "save " + std::to_string(m_saved) + " load " + std::to_string(m_loaded);
+    }
+    const std::wstring& name() const { return m_name; }
+    // name\rel, below HKEY_USERS.
+    std::wstring Key(const std::wstring& rel) const { return m_name + L"\\" + rel; }
+
+private:
+    std::wstring m_name;
+    std::wstring m_file;
+    LONG m_saved = ERROR_INVALID_FUNCTION;
+    LONG m_loaded = ERROR_INVALID_FUNCTION;
 };

@@ -115,20 +115,6 @@ TEST(TraceDelivery, LevelWrappersGoToTheResidentEntry) {
     EXPECT_EQ("NIHandle lpCmdLine=-x,\n", records[3].text);
 }
 
-TEST(TraceDelivery, LongRecordArrivesInPiecesOnlyTheLastEndingTheLine) {
-    TraceCapture capture;
-    std::string value(5000 - 3, 'v');  // " " + value + ",\n" is 5000 characters
-    TraceLevel1(TraceValue(value));
-    std::vector<TraceRecord> records = capture.Records();
-    ASSERT_EQ(3u, records.size());
-    EXPECT_EQ(2047u, records[0].text.size());
-    EXPECT_EQ(2047u, records[1].text.size());
-    EXPECT_EQ(906u, records[2].text.size());
-    EXPECT_EQ(std::string::npos, records[0].text.find('\n'));
-    EXPECT_EQ(std::string::npos, records[1].text.find('\n'));
-    EXPECT_EQ(" " + value + ",\n", records[0].text + records[1].text + records[2].text);
-}
-
 TEST(TraceDelivery, FunctionTraceWritesEntryAndExit) {
     TraceCapture capture;
     {
