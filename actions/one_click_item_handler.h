@@ -1,7 +1,7 @@
 // One-click items: Actions carried out by the suite's one-click library.
 #pragma once
 
-#include "app/command_info.h"
+#include "actions/command_info.h"
 #include "base/string_ex.h"
 
 class COneClickItemHandler {

@@ -2,7 +2,7 @@
 // CommandInfo record.
 #pragma once
 
-#include "app/command_info.h"
+#include "actions/command_info.h"
 #include "base/string_ex.h"
 
 class CCmdLineParser {

@@ -4,7 +4,7 @@
 
 #include <windows.h>
 
-#include "app/command_info.h"
+#include "actions/command_info.h"
 
 // The exit code of the one command on the command line.
 int RunCommandLine(HINSTANCE instance, HINSTANCE previousInstance, const wchar_t* commandLine,

@@ -9,7 +9,7 @@
 
 #include "bench/process_timing.h"
 #include "app/cmdline_parser.h"
-#include "app/command_info.h"
+#include "actions/command_info.h"
 
 namespace {
 

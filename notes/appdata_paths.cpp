@@ -2,7 +2,7 @@
 // created on first use.
 #include <shlobj.h>
 
-#include "base/com_ptr.h"
+#include "base/com_owners.h"
 #include "base/trace.h"
 #include "notes/plugin_paths.h"
 #include "notes/product_locations.h"

@@ -2,7 +2,7 @@
 
 #include <msxml2.h>
 
-#include "base/com_ptr.h"
+#include "base/com_owners.h"
 #include "base/trace.h"
 #include "notes/untrusted_xml_bytes.h"
 
@@ -72,7 +72,7 @@ class CPlatformXml {
 public:
     PlatformXmlStatus Open(const wchar_t* path, const SiteXPaths& sites) {
         if (FAILED(CoCreateInstance(kClsidDomDocument30, nullptr, CLSCTX_ALL, kIidXmlDomDocument,
-                                    m_doc.put_void())) ||
+                                    reinterpret_cast<void**>(m_doc.ReleaseAndGetAddressOf()))) ||
             !m_doc) {
             return PlatformXmlStatus::kCannotCreate;
         }
@@ -80,7 +80,7 @@ public:
             return PlatformXmlStatus::kLoadFailed;
         }
         for (const wchar_t* xpath : sites) {
-            if (xpath != nullptr && SelectSingle(m_doc.get(), xpath, &m_site)) {
+            if (xpath != nullptr && SelectSingle(m_doc.Get(), xpath, &m_site)) {
                 return PlatformXmlStatus::kOk;
             }
         }
@@ -88,24 +88,26 @@ public:
     }
 
     bool FindFeature(ComPtr<IXMLDOMNode>* feature) {
-        return SelectSingle(m_site.get(), kFeatureXPath, feature);
+        return SelectSingle(m_site.Get(), kFeatureXPath, feature);
     }
 
     // Appends <feature id url version/> as the site's last child.
     bool AddFeature() {
         ComPtr<IXMLDOMElement> element;
         UniqueBstr name = MakeBstr(kFeatureElement);
-        if (m_doc->createElement(name.get(), element.put()) != S_OK || !element) {
+        if (m_doc->createElement(name.get(), element.ReleaseAndGetAddressOf()) != S_OK ||
+            !element) {
             return false;
         }
         ComPtr<IXMLDOMNamedNodeMap> attributes;
-        if (element->get_attributes(attributes.put()) != S_OK || !attributes) {
+        if (element->get_attributes(attributes.ReleaseAndGetAddressOf()) != S_OK || !attributes) {
             return false;
         }
         for (const FeatureAttribute& item : kFeatureAttributes) {
             ComPtr<IXMLDOMAttribute> attribute;
             UniqueBstr attributeName = MakeBstr(item.name);
-            if (m_doc->createAttribute(attributeName.get(), attribute.put()) != S_OK ||
+            if (m_doc->createAttribute(attributeName.get(), attribute.ReleaseAndGetAddressOf()) !=
+                    S_OK ||
                 !attribute) {
                 return false;
             }
@@ -113,17 +115,17 @@ public:
             SetStringVariant(value, item.value);
             ComPtr<IXMLDOMNode> added;
             if (FAILED(attribute->put_nodeValue(*value.get())) ||
-                FAILED(attributes->setNamedItem(attribute.get(), added.put()))) {
+                FAILED(attributes->setNamedItem(attribute.Get(), added.ReleaseAndGetAddressOf()))) {
                 return false;
             }
         }
         ComPtr<IXMLDOMNode> appended;
-        return m_site->appendChild(element.get(), appended.put()) == S_OK;
+        return m_site->appendChild(element.Get(), appended.ReleaseAndGetAddressOf()) == S_OK;
     }
 
     bool RemoveFeature(const ComPtr<IXMLDOMNode>& feature) {
         ComPtr<IXMLDOMNode> removed;
-        return m_site->removeChild(feature.get(), removed.put()) == S_OK;
+        return m_site->removeChild(feature.Get(), removed.ReleaseAndGetAddressOf()) == S_OK;
     }
 
     bool Save(const wchar_t* path) {
@@ -136,7 +138,7 @@ private:
     // S_FALSE with a null node means "nothing selected".
     static bool SelectSingle(IXMLDOMNode* from, const wchar_t* xpath, ComPtr<IXMLDOMNode>* out) {
         UniqueBstr query = MakeBstr(xpath);
-        return from->selectSingleNode(query.get(), out->put()) == S_OK && *out;
+        return from->selectSingleNode(query.get(), out->ReleaseAndGetAddressOf()) == S_OK && *out;
     }
 
     static void SetProperty(IXMLDOMDocument2* doc, const wchar_t* name, VARIANT value) {
@@ -152,20 +154,22 @@ private:
         m_doc->put_validateOnParse(VARIANT_FALSE);
         m_doc->put_resolveExternals(VARIANT_FALSE);
         ComPtr<IXMLDOMDocument2> doc2;
-        if (SUCCEEDED(m_doc->QueryInterface(kIidXmlDomDocument2, doc2.put_void())) && doc2) {
+        if (SUCCEEDED(m_doc->QueryInterface(
+                kIidXmlDomDocument2, reinterpret_cast<void**>(doc2.ReleaseAndGetAddressOf()))) &&
+            doc2) {
             UniqueVariant language;
             SetStringVariant(language, L"XPath");
-            SetProperty(doc2.get(), L"SelectionLanguage", *language.get());
+            SetProperty(doc2.Get(), L"SelectionLanguage", *language.get());
             VARIANT prohibit;
             VariantInit(&prohibit);
             V_VT(&prohibit) = VT_BOOL;
             V_BOOL(&prohibit) = VARIANT_TRUE;
-            SetProperty(doc2.get(), L"ProhibitDTD", prohibit);
+            SetProperty(doc2.Get(), L"ProhibitDTD", prohibit);
             VARIANT depth;
             VariantInit(&depth);
             V_VT(&depth) = VT_I4;
             V_I4(&depth) = kMaxElementDepth;
-            SetProperty(doc2.get(), L"MaxElementDepth", depth);
+            SetProperty(doc2.Get(), L"MaxElementDepth", depth);
         }
 
         UniqueVariant source;
@@ -184,7 +188,7 @@ private:
         }
         // A declaration the byte check could not see still ends here.
         ComPtr<IXMLDOMDocumentType> doctype;
-        if (m_doc->get_doctype(doctype.put()) == S_OK && doctype) {
+        if (m_doc->get_doctype(doctype.ReleaseAndGetAddressOf()) == S_OK && doctype) {
             LogLoadRefusal(UntrustedXmlRead::kHasDoctype);
             return false;
         }

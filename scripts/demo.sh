@@ -68,26 +68,9 @@ run() {
   tr -d '\r' < "$prefix/run.out"
 }
 
-section "Maintenance command: copy the Notes plug-in files into Notes"
-run -copyfilestonotes
-echo "  Notes folder now:"
-listing "$notes"
-
-section "Maintenance command: enable the meeting feature in the Sametime 8 profiles"
-run -enablesametime8confige -issametime8enable
-echo "  platform.xml now:"
-sed 's/^/    /' "$config/platform.xml"
-echo "  configuration folder now:"
-listing "$config"
-
-section "Maintenance command: remove the Notes plug-in files"
-run -delnifiles
-echo "  Notes folder now:"
-listing "$notes"
-
-section "Action commands"
-run '<CmdLine><Action>OpenHelp</Action><hWnd>0</hWnd></CmdLine>' \
-    '<CmdLine><Action>NoSuchAction</Action></CmdLine>'
-
-section "Unknown keyword"
-run -nosuchkeyword
+# Each step of the road lives in scripts/demo.d, run in the order of its
+# number: 1x-3x install, 4x-6x use, 7x-9x uninstall.
+for step in "$here"/scripts/demo.d/*.sh; do
+  # shellcheck source=/dev/null
+  source "$step"
+done

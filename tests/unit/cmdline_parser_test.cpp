@@ -6,7 +6,7 @@
 #include <string>
 
 #include "app/cmdline_parser.h"
-#include "app/command_info.h"
+#include "actions/command_info.h"
 #include "base/string_ex.h"
 #include "tests/support/trace_capture.h"
 

@@ -16,6 +16,8 @@ case "$command" in
     rm -rf "$dir"; mkdir -p "$(dirname "$dir")"
     WINEPREFIX="$dir" wineboot --init >/dev/null 2>&1
     WINEPREFIX="$dir" wine reg add 'HKCU\Software\Wine\Drivers' /v Graphics /d null /f >/dev/null 2>&1
+    # A crash ends the process at once instead of waiting behind a dialog.
+    WINEPREFIX="$dir" wine reg add 'HKCU\Software\Wine\WineDbg' /v ShowCrashDialog /t REG_DWORD /d 0 /f >/dev/null 2>&1
     WINEPREFIX="$dir" wineserver -w
     touch "$dir/.qm-template-ready"
     ;;
