@@ -40,11 +40,9 @@ int wmain(int argc, wchar_t** argv) {
         std::wstring arguments = argv[i];
         printf("\n$ qmMrvONI.exe %s\n", Narrow(arguments).c_str());
         DeleteFileW(traceLog.c_str());
-        RunResult run;
-        RunAsDebuggee(L"\"" + program + L"\" " + arguments,
-                      BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", traceLog}}), folder, 120000,
-                      &run);
-        for (const TraceRecord& record : ParseTraceLog(ReadFileBytes(traceLog))) {
+        SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", traceLog.c_str());
+        RunResult run = RunDebuggee(L"\"" + program + L"\" " + arguments, folder, 120000);
+        for (const TraceRecord& record : ReadTraceLog(traceLog)) {
             printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
             PrintRecordText(record.text);
             printf("\n");

@@ -16,15 +16,11 @@
 
 extern const wchar_t kEnvironmentKey[];     // Session Manager\Environment
 extern const wchar_t kSessionManagerKey[];  // holds PendingFileRenameOperations
-
-// Removes every key, value and per-user folder the simulated products use.
-void ClearProductState();
+// Uninstall entries that tests create are named with this prefix.
+extern const wchar_t kTestUninstallPrefix[];
 
 // The user's roaming application-data folder of this prefix.
 std::wstring RoamingAppData();
-
-// Uninstall entries that tests create are named with this prefix.
-extern const wchar_t kTestUninstallPrefix[];
 
 class MachineTest : public ::testing::Test {
 protected:

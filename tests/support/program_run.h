@@ -1,7 +1,7 @@
 // Runs qmMrvONI.exe the way an installer does, from a scratch install folder
 // that also holds the test stand-ins, and collects what it did: the exit
-// code, its debugger output (the program runs as a debuggee) and the records
-// the trace stand-in received.
+// code, its debugger output (it runs as a debuggee) and the records the trace
+// stand-in received.
 #pragma once
 
 #include <windows.h>
@@ -17,25 +17,27 @@ struct TraceRecord {
     std::string text;
 };
 
-// Parses the stand-in's log format.
-std::vector<TraceRecord> ParseTraceLog(const std::string& bytes);
+// The records of a trace stand-in's log file.
+std::vector<TraceRecord> ReadTraceLog(const std::wstring& path);
 
 struct RunResult {
     int exitCode = 0;
     bool timedOut = false;
-    bool crashed = false;  // an exception reached the last chance
+    bool crashed = false;  // an exception reached its last chance
     std::vector<std::string> debugOutput;
     std::vector<TraceRecord> traces;
-    std::vector<DWORD> firstChanceExceptions;
 
-    // The texts of all records, joined.
-    std::string TraceText() const;
-    // Records whose text equals `text` exactly.
-    int CountTraces(const std::string& text) const;
+    std::string TraceText() const;                   // the texts of all records, joined
+    int CountTraces(const std::string& text) const;  // records whose text is exactly `text`
     bool HasTrace(const std::string& text) const { return CountTraces(text) > 0; }
     bool HasTraceContaining(const std::string& part) const;
     bool HasDebugOutput(const std::string& text) const;
 };
+
+// Runs commandLine as a debuggee in workingDir until it ends (it is killed
+// after timeoutMs) and collects its exit code and debugger output.
+RunResult RunDebuggee(const std::wstring& commandLine, const std::wstring& workingDir,
+                      DWORD timeoutMs);
 
 enum class TraceLibrary {
     kBoth,     // exports both entry points
@@ -56,14 +58,13 @@ public:
 
     const std::wstring& folder() const { return m_folder; }
     const std::wstring& exePath() const { return m_exePath; }
-    std::wstring traceLogPath() const { return m_folder + L"\\trace.log"; }
     std::wstring callsLogPath() const { return m_folder + L"\\calls.log"; }
 
-    // Extra environment for every run.
+    // Extra environment for every run; an empty value removes the variable.
     void SetEnv(const std::wstring& name, const std::wstring& value) { m_env[name] = value; }
 
-    // Runs with `arguments` as the command line after the program name.
-    // Trace and calls logs are emptied first.
+    // Runs with `arguments` after the quoted program path, in the program's
+    // folder. The stand-ins' logs are emptied first.
     RunResult Run(const std::wstring& arguments, DWORD timeoutMs = 60000);
     // Runs with exactly this command line (program name included).
     RunResult RunRaw(const std::wstring& commandLine, DWORD timeoutMs = 60000);
@@ -73,12 +74,3 @@ private:
     std::wstring m_exePath;
     std::map<std::wstring, std::wstring> m_env;
 };
-
-// Environment block of this process with `overrides` applied (names compared
-// without regard to case).
-std::vector<wchar_t> BuildEnvironmentBlock(const std::map<std::wstring, std::wstring>& overrides);
-
-// Runs a command line as a debuggee until it exits (or is killed after
-// timeoutMs) and fills result (exit code, debugger output, exceptions).
-void RunAsDebuggee(const std::wstring& commandLine, const std::vector<wchar_t>& environment,
-                   const std::wstring& workingDir, DWORD timeoutMs, RunResult* result);

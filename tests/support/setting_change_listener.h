@@ -5,6 +5,7 @@
 #include <windows.h>
 
 #include <atomic>
+#include <thread>
 
 class SettingChangeListener {
 public:
@@ -13,16 +14,14 @@ public:
     SettingChangeListener(const SettingChangeListener&) = delete;
     SettingChangeListener& operator=(const SettingChangeListener&) = delete;
 
-    bool ready() const { return m_window != nullptr; }
-    int environmentChanges() const { return m_count.load(); }
+    bool ready() const { return m_ready; }
+    int environmentChanges() const { return m_count; }
 
 private:
-    static DWORD WINAPI ThreadMain(void* self);
     static LRESULT CALLBACK WindowProc(HWND window, UINT message, WPARAM wParam, LPARAM lParam);
 
-    HANDLE m_thread = nullptr;
-    HANDLE m_started = nullptr;
-    DWORD m_threadId = 0;
-    HWND m_window = nullptr;
     std::atomic<int> m_count{0};
+    std::atomic<DWORD> m_threadId{0};
+    bool m_ready = false;
+    std::thread m_thread;
 };
