@@ -1,17 +1,13 @@
 // The program as installers start it: mode selection, the trace records it
-// writes (byte for byte) and where they go, the suite library it holds, its
-// image resources, and hostile command lines.
-#include <windows.h>
+// writes (byte for byte) and where they go, the suite library it holds, and
+// hostile command lines.
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <string>
-#include <vector>
 
 #include "tests/support/file_util.h"
 #include "tests/support/program_run.h"
 #include "tests/support/scratch_dir.h"
-#include "tests/support/test_paths.h"
 
 namespace {
 
@@ -97,25 +93,10 @@ TEST_F(EntryTest, RecordsAreCutInto2047CharacterPieces) {
     }
 }
 
-TEST(EntryTraceLibrary, OnlyTheRawEntryGivesANullModuleTag) {
-    ScratchDir scratch(L"raw");
-    ProgramOptions options;
-    options.traceLibrary = TraceLibrary::kRawOnly;
-    options.withSuiteLibrary = false;  // missing, and nobody notices
-    RunResult run = ProgramUnderTest(scratch.path(), options).Run(L"-x");
-    EXPECT_EQ(0, run.exitCode);
-    ASSERT_EQ(1u, run.traces.size());
-    EXPECT_EQ("RAWA", run.traces[0].entry);
-    EXPECT_EQ("(null)", run.traces[0].tag);
-    EXPECT_EQ("NIHandle lpCmdLine=-x,\n", run.traces[0].text);
-}
-
 TEST(EntryTraceLibrary, WithoutItEachPieceGoesToTheDebuggerOutput) {
-    ScratchDir scratch(L"none");
-    ProgramOptions options;
-    options.traceLibrary = TraceLibrary::kNone;
+    ScratchDir scratch(L"none");  // and no suite library: nobody notices
     const std::wstring line = L"-" + std::wstring(3000, L'k');  // a record of two pieces
-    RunResult run = ProgramUnderTest(scratch.path(), options).Run(line);
+    RunResult run = ProgramUnderTest(scratch.path(), {TraceLibrary::kNone, false}).Run(line);
     EXPECT_EQ(0, run.exitCode);
     const std::string record = "NIHandle lpCmdLine=" + Narrow(line) + ",\n";
     const std::vector<std::string> expected = {"Trace lib invalid\n", record.substr(0, 2047),
@@ -157,28 +138,6 @@ TEST_F(EntryTest, HostileCommandLinesEndCleanly) {
         EXPECT_FALSE(run.crashed || run.timedOut) << arguments.size();
         EXPECT_EQ(0, run.exitCode) << arguments.size();
     }
-}
-
-TEST(ProgramImage, CarriesItsManifestAndVersion) {
-    const std::wstring exe = BuiltProgramPath();
-    HMODULE image = LoadLibraryExW(exe.c_str(), nullptr, LOAD_LIBRARY_AS_DATAFILE);
-    ASSERT_NE(nullptr, image);
-    HRSRC found = FindResourceW(image, MAKEINTRESOURCEW(1), MAKEINTRESOURCEW(24));
-    ASSERT_NE(nullptr, found);
-    const std::string manifest(static_cast<const char*>(LockResource(LoadResource(image, found))),
-                               SizeofResource(image, found));
-    FreeLibrary(image);
-    EXPECT_NE(std::string::npos, manifest.find("level=\"asInvoker\""));
-    EXPECT_NE(std::string::npos, manifest.find("{35138b9a-5d96-4fbd-8e2d-a2440225f93a}"));  // 7
-
-    std::vector<BYTE> info(GetFileVersionInfoSizeW(exe.c_str(), nullptr));
-    ASSERT_FALSE(info.empty());
-    ASSERT_TRUE(GetFileVersionInfoW(exe.c_str(), 0, static_cast<DWORD>(info.size()), info.data()));
-    wchar_t* name = nullptr;
-    UINT length = 0;
-    ASSERT_TRUE(VerQueryValueW(info.data(), L"\\StringFileInfo\\040904B0\\OriginalFilename",
-                               reinterpret_cast<void**>(&name), &length));
-    EXPECT_STREQ(L"qmMrvONI.exe", name);
 }
 
 }  // namespace

@@ -1,10 +1,6 @@
 // The Maintenance command keywords with a start message of their own, run on
 // a machine without any of the products: the message each logs right after
 // the dispatcher's entry record (level 1, byte for byte) and the exit code 0.
-#include <windows.h>
-#include <gtest/gtest.h>
-
-#include <string>
 
 #include "tests/support/file_util.h"
 #include "tests/support/machine_fixture.h"

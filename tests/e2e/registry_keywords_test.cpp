@@ -2,10 +2,6 @@
 // views, the old context-menu classes, the console user's start-up entries and
 // settings key, and the old Outlook integration's setting. Each removes exactly
 // its own entries.
-#include <windows.h>
-#include <gtest/gtest.h>
-
-#include <string>
 
 #include "tests/support/file_util.h"
 #include "tests/support/machine_fixture.h"

@@ -3,11 +3,6 @@
 // with its program and data folders.
 #pragma once
 
-#include <windows.h>
-#include <gtest/gtest.h>
-
-#include <string>
-
 #include "tests/support/file_util.h"
 #include "tests/support/held_files.h"
 #include "tests/support/machine_fixture.h"

@@ -7,27 +7,14 @@
 
 #include "base/win_handles.h"
 
-namespace {
-
-DWORD Attributes(const std::wstring& path) {
-    return GetFileAttributesW(path.c_str());
-}
-
-std::wstring ParentOf(const std::wstring& path) {
-    size_t slash = path.find_last_of(L"\\/");
-    return slash == std::wstring::npos ? std::wstring() : path.substr(0, slash);
-}
-
-}  // namespace
-
 bool FileExists(const std::wstring& path) {
-    return Attributes(path) != INVALID_FILE_ATTRIBUTES &&
-           !(Attributes(path) & FILE_ATTRIBUTE_DIRECTORY);
+    DWORD attributes = GetFileAttributesW(path.c_str());
+    return attributes != INVALID_FILE_ATTRIBUTES && !(attributes & FILE_ATTRIBUTE_DIRECTORY);
 }
 
 bool DirExists(const std::wstring& path) {
-    return Attributes(path) != INVALID_FILE_ATTRIBUTES &&
-           (Attributes(path) & FILE_ATTRIBUTE_DIRECTORY);
+    DWORD attributes = GetFileAttributesW(path.c_str());
+    return attributes != INVALID_FILE_ATTRIBUTES && (attributes & FILE_ATTRIBUTE_DIRECTORY);
 }
 
 bool MakeDirs(const std::wstring& path) {
@@ -36,7 +23,9 @@ bool MakeDirs(const std::wstring& path) {
 }
 
 bool WriteFileBytes(const std::wstring& path, const std::string& bytes) {
-    MakeDirs(ParentOf(path));
+    if (size_t slash = path.find_last_of(L"\\/"); slash != std::wstring::npos) {
+        MakeDirs(path.substr(0, slash));
+    }
     UniqueFileHandle file(CreateFileW(path.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_ALWAYS,
                                       FILE_ATTRIBUTE_NORMAL, nullptr));
     DWORD written = 0;

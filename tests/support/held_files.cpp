@@ -3,21 +3,11 @@
 #include "tests/support/machine_fixture.h"
 #include "tests/support/registry_util.h"
 
-HeldOpen::HeldOpen(const std::wstring& path, DWORD share)
-    : m_handle(CreateFileW(path.c_str(), GENERIC_READ, share, nullptr, OPEN_EXISTING,
-                           FILE_ATTRIBUTE_NORMAL, nullptr)) {}
-
-HeldOpen::~HeldOpen() {
-    if (ok()) {
-        CloseHandle(m_handle);
-    }
-}
-
 std::string HeldOpen::Read() const {
-    SetFilePointer(m_handle, 0, nullptr, FILE_BEGIN);
+    SetFilePointer(m_handle.get(), 0, nullptr, FILE_BEGIN);
     char buffer[256];
     DWORD got = 0;
-    ReadFile(m_handle, buffer, sizeof(buffer), &got, nullptr);
+    ReadFile(m_handle.get(), buffer, sizeof(buffer), &got, nullptr);
     return std::string(buffer, got);
 }
 

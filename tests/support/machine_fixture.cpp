@@ -12,7 +12,6 @@ const wchar_t kTestUninstallPrefix[] = L"QMTest";
 namespace {
 
 const wchar_t kUninstallKey[] = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall";
-const wchar_t kRunKey[] = L"Software\\Microsoft\\Windows\\CurrentVersion\\Run";
 
 // Every key, value and per-user folder the simulated products use.
 void ClearProductState() {
@@ -48,11 +47,11 @@ void ClearProductState() {
             }
         }
     }
+    const std::wstring run = L"Software\\Microsoft\\Windows\\CurrentVersion\\Run";
     for (const wchar_t* name : {L"QMOneClick", L"QMIM.exe", L"qmmsgfrm.exe"}) {
-        RegRemoveValue(HKEY_CURRENT_USER, kRunKey, name);
+        RegRemoveValue(HKEY_CURRENT_USER, run, name);
     }
-    RegRemoveValue(HKEY_CURRENT_USER, L"Software\\Microsoft\\Windows\\CurrentVersion\\Runonce",
-                   L"Mirovan_QM");
+    RegRemoveValue(HKEY_CURRENT_USER, run + L"once", L"Mirovan_QM");
     for (const wchar_t* folder : {L"Lotus", L"IBM", L"Mirovan"}) {
         RemoveTree(JoinPath(RoamingAppData(), folder));
     }

@@ -53,17 +53,11 @@ bool RunResult::HasDebugOutput(const std::string& text) const {
 namespace {
 
 std::string ReadDebugString(HANDLE process, const OUTPUT_DEBUG_STRING_INFO& info) {
-    const SIZE_T chars = std::min<SIZE_T>(info.nDebugStringLength, 1u << 20);
-    const SIZE_T unit = info.fUnicode ? sizeof(wchar_t) : 1;
-    std::string raw(chars * unit, '\0');
-    SIZE_T got = 0;
-    ReadProcessMemory(process, info.lpDebugStringData, &raw[0], raw.size(), &got);
-    raw.resize(got);
-    std::string text = info.fUnicode
-                           ? Narrow(std::wstring(reinterpret_cast<const wchar_t*>(raw.data()),
-                                                 got / sizeof(wchar_t)))
-                           : raw;
-    return text.substr(0, text.find('\0'));
+    std::vector<wchar_t> text(std::min<SIZE_T>(info.nDebugStringLength, 1u << 20) + 1, L'\0');
+    SIZE_T unit = info.fUnicode ? sizeof(wchar_t) : 1;
+    ReadProcessMemory(process, info.lpDebugStringData, text.data(), (text.size() - 1) * unit,
+                      nullptr);
+    return info.fUnicode ? Narrow(text.data()) : reinterpret_cast<const char*>(text.data());
 }
 
 }  // namespace
@@ -151,16 +145,14 @@ RunResult ProgramUnderTest::RunRaw(const std::wstring& commandLine, DWORD timeou
     // The program inherits this process's environment, changed for the run.
     std::map<std::wstring, std::wstring> saved;
     for (const auto& [name, value] : m_env) {
-        wchar_t old[32768];
-        DWORD length = GetEnvironmentVariableW(name.c_str(), old, 32768);
-        saved[name] = length > 0 && length < 32768 ? old : L"";
+        std::vector<wchar_t> old(32768);
+        saved[name] = GetEnvironmentVariableW(name.c_str(), old.data(), 32768) ? old.data() : L"";
         SetEnvironmentVariableW(name.c_str(), value.empty() ? nullptr : value.c_str());
     }
-    const std::wstring traceLog = m_env[L"QM_FAKE_TRACE_LOG"];
-    DeleteFileW(traceLog.c_str());
+    DeleteFileW(m_env[L"QM_FAKE_TRACE_LOG"].c_str());
     DeleteFileW(callsLogPath().c_str());
     RunResult result = RunDebuggee(commandLine, m_folder, timeoutMs);
-    result.traces = ReadTraceLog(traceLog);
+    result.traces = ReadTraceLog(m_env[L"QM_FAKE_TRACE_LOG"]);
     for (const auto& [name, value] : saved) {
         SetEnvironmentVariableW(name.c_str(), value.empty() ? nullptr : value.c_str());
     }

@@ -1,7 +1,5 @@
-// Runs qmMrvONI.exe the way an installer does, from a scratch install folder
-// that also holds the test stand-ins, and collects what it did: the exit
-// code, its debugger output (it runs as a debuggee) and the records the trace
-// stand-in received.
+// Runs qmMrvONI.exe as an installer does, from a scratch folder that also holds
+// the stand-ins, and collects its exit code, debugger output and trace records.
 #pragma once
 
 #include <windows.h>
@@ -34,8 +32,8 @@ struct RunResult {
     bool HasDebugOutput(const std::string& text) const;
 };
 
-// Runs commandLine as a debuggee in workingDir until it ends (it is killed
-// after timeoutMs) and collects its exit code and debugger output.
+// Runs commandLine as a debuggee in workingDir until it ends (or is killed
+// after timeoutMs).
 RunResult RunDebuggee(const std::wstring& commandLine, const std::wstring& workingDir,
                       DWORD timeoutMs);
 
@@ -63,8 +61,7 @@ public:
     // Extra environment for every run; an empty value removes the variable.
     void SetEnv(const std::wstring& name, const std::wstring& value) { m_env[name] = value; }
 
-    // Runs with `arguments` after the quoted program path, in the program's
-    // folder. The stand-ins' logs are emptied first.
+    // Runs with `arguments` after the quoted program path, in its folder.
     RunResult Run(const std::wstring& arguments, DWORD timeoutMs = 60000);
     // Runs with exactly this command line (program name included).
     RunResult RunRaw(const std::wstring& commandLine, DWORD timeoutMs = 60000);

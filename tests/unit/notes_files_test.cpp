@@ -1,12 +1,6 @@
 // The Notes plug-in file operations the keyword runs cannot drive: the
 // failure paths of the copy with backup (through its platform seam), the
-// backup name, the completion after an update, and the old install folder
-// with a foreign file.
-#include <windows.h>
-#include <gtest/gtest.h>
-
-#include <string>
-#include <vector>
+// backup name, and the old install folder with a foreign file.
 
 #include "notes/copy_with_backup.h"
 #include "notes/notes_plugin_files.h"
@@ -112,28 +106,6 @@ TEST_F(NotesFilesTest, FileUnderTheBackupNameIsNeverReplaced) {
     EXPECT_TRUE(CopyOverLoadedTarget(platform));
     EXPECT_EQ("new content", ReadFileBytes(m_target));
     EXPECT_EQ("old content", ReadFileBytes(m_target + L".2025.1.1.0.0.1.bak"));
-}
-
-TEST_F(NotesFilesTest, CompletionCopiesOnlyMissingFilesAndStopsAtTheFirstFailure) {
-    const std::wstring plugin = m_scratch.Sub(L"plugin", true);
-    for (const std::wstring name : kPluginFiles) {
-        WriteFileBytes(JoinPath(plugin, name), "plugin");
-        WriteFileBytes(JoinPath(m_folder, name), "present");
-    }
-    auto in = [](const std::wstring& folder, int i) { return JoinPath(folder, kPluginFiles[i]); };
-    // Missing in Notes: the 3rd, 5th and 10th; missing in the plug-in folder: the 5th.
-    for (int i : {2, 4, 9}) {
-        DeleteFileW(in(m_folder, i).c_str());
-    }
-    DeleteFileW(in(plugin, 4).c_str());
-    EXPECT_FALSE(CopyPluginRemainedFiles(m_folder.c_str(), plugin.c_str()));
-    EXPECT_EQ("plugin", ReadFileBytes(in(m_folder, 2)));
-    EXPECT_EQ("present", ReadFileBytes(in(m_folder, 3)));
-    EXPECT_FALSE(FileExists(in(m_folder, 9)));
-
-    WriteFileBytes(in(plugin, 4), "plugin");
-    EXPECT_TRUE(CopyPluginRemainedFiles(m_folder.c_str(), plugin.c_str()));
-    EXPECT_EQ("plugin", ReadFileBytes(in(m_folder, 9)));
 }
 
 TEST_F(NotesFilesTest, OldInstallFolderWithAForeignFileStays) {

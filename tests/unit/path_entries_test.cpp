@@ -1,8 +1,6 @@
 // Whole-entry editing of the search path text.
 #include <gtest/gtest.h>
 
-#include <string>
-
 #include "cleanup/path_entries.h"
 #include "tests/support/file_util.h"
 

@@ -4,8 +4,6 @@
 #include <windows.h>
 #include <gtest/gtest.h>
 
-#include <string>
-
 #include "notes/untrusted_xml_bytes.h"
 #include "tests/support/file_util.h"
 #include "tests/support/scratch_dir.h"

@@ -1,12 +1,8 @@
 // The product lookups against real registry keys: values that do not fit the
 // caller's buffer count as absent (and leave it empty), the Notes key order and
-// version rules, the plug-in folder, the multi-user and Citrix branches, and
-// the Sametime search with its time budget.
-#include <windows.h>
-#include <gtest/gtest.h>
+// version rules, the plug-in folder, and the Sametime search with its budget.
 
 #include <algorithm>
-#include <string>
 
 #include "notes/product_locations.h"
 #include "notes/sametime_path_search.h"
@@ -105,27 +101,6 @@ TEST_F(LocationsTest, NotesVersionRules) {
     }
     ASSERT_TRUE(RegMakeKey(kMachine, kNotes8));
     EXPECT_EQ(8u, GetNotesVersion());  // the 8.0 key wins over the Version value
-    ASSERT_TRUE(RegMakeKey(kMachine, kNotes6));
-    EXPECT_EQ(6u, GetNotesVersion());  // 6.0 and 8.0 both present
-}
-
-TEST_F(LocationsTest, EmbeddedSametimeDataFolderMultiUserAndCitrix) {
-    ASSERT_TRUE(RegPutString(kMachine, kNotes8, L"DataPath", L"C:\\Notes8\\Data"));
-    Buffer buffer;
-    DWORD version = 0;
-    EXPECT_TRUE(GetEmbeddedSTDataPath(buffer.text, buffer.capacity, &version));
-    EXPECT_EQ(8u, version);
-    EXPECT_STREQ(L"C:\\Notes8\\Data", buffer.text);
-    // On a Citrix server without multi-user Notes there is no data folder.
-    ASSERT_TRUE(RegMakeKey(kMachine, L"SOFTWARE\\Citrix\\Citrix Management Console"));
-    EXPECT_FALSE(GetEmbeddedSTDataPath(buffer.text, buffer.capacity, &version));
-    EXPECT_TRUE(buffer.Empty());
-    // Multi-user: the folder of the user's notes.ini, Citrix or not.
-    ASSERT_TRUE(RegPutDword(kMachine, kNotes, L"MultiUser", 1));
-    ASSERT_TRUE(RegPutString(HKEY_CURRENT_USER, L"Software\\Lotus\\Notes\\8.0", L"NotesIniPath",
-                             L"D:\\Notes\\Data\\notes.ini"));
-    EXPECT_TRUE(GetEmbeddedSTDataPath(buffer.text, buffer.capacity, &version));
-    EXPECT_STREQ(L"D:\\Notes\\Data", buffer.text);
 }
 
 TEST_F(LocationsTest, PluginFolderEndsInNotes) {

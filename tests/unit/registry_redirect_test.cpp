@@ -4,10 +4,7 @@
 // under HKCU reach that root; deletions and existence tests stay with the
 // process's own HKCU. The platform must be in place before the first registry
 // call, so this test program has its own process.
-#include <windows.h>
 #include <gtest/gtest.h>
-
-#include <string>
 
 #include "base/registry.h"
 #include "base/registry_delete.h"

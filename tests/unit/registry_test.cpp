@@ -1,12 +1,13 @@
-// The registry value functions on real keys: reads that stay inside the
-// caller's buffer, values of another type counting as absent, and writes that
-// create their key in their own view only.
-#include <windows.h>
+// The registry functions on real keys: reads that stay inside the caller's
+// buffer, values of another type counting as absent, and deletions of a key
+// with its subkeys (CRegistry::RecurDeleteKey and, below a parent,
+// RecursDeleteRegisterKey) that take nothing in the other view and nothing
+// for an empty name.
 #include <gtest/gtest.h>
 
-#include <string>
-
 #include "base/registry.h"
+#include "base/registry_delete.h"
+#include "base/win_handles.h"
 #include "tests/unit/scratch_key.h"
 
 namespace {
@@ -50,17 +51,47 @@ TEST(RegistryValues, ValuesOfAnotherTypeCountAsAbsent) {
     }
 }
 
-TEST(RegistryValues, WritesCreateTheMissingKeyInTheirOwnViewOnly) {
-    // HKLM\SOFTWARE is split between the views: what one gets, the other lacks.
-    ScratchKey scratch(HKEY_LOCAL_MACHINE, L"SOFTWARE");
-    const std::wstring split = scratch.Sub(L"a\\b");
-    ASSERT_TRUE(SetRegString(HKEY_LOCAL_MACHINE, split.c_str(), L"Which", L"64", KEY_WOW64_64KEY));
-    ASSERT_TRUE(SetRegDWORD(HKEY_LOCAL_MACHINE, split.c_str(), L"N", 64, KEY_WOW64_64KEY));
-    EXPECT_FALSE(RegHasKey(HKEY_LOCAL_MACHINE, split, 0));
-    CStringEx text;
-    EXPECT_TRUE(GetRegString(HKEY_LOCAL_MACHINE, split.c_str(), L"Which", text, KEY_WOW64_64KEY));
-    EXPECT_STREQ(L"64", text.c_str());
-    EXPECT_FALSE(GetRegString(HKEY_LOCAL_MACHINE, split.c_str(), L"Which", text, 0));
+// top with children "a" and "b" down to `levels` below it and a value on every key.
+void MakeTree(HKEY root, const std::wstring& top, int levels, REGSAM view = 0) {
+    RegPutString(root, top, L"v", top, view);
+    for (const wchar_t* child : {L"\\a", L"\\b"}) {
+        if (levels > 0) {
+            MakeTree(root, top + child, levels - 1, view);
+        }
+    }
+}
+
+class RegistryDeleteTest : public ::testing::Test {
+protected:
+    bool Has(const std::wstring& rel) const { return RegHasKey(kUser, m_user.Sub(rel)); }
+
+    ScratchKey m_user{kUser, L"Software"};
+};
+
+TEST_F(RegistryDeleteTest, RecurDeleteKeyDeletesInTheViewItWasGivenOnly) {
+    // A tree in the 64-bit view and a key of the same name in the 32-bit view.
+    ScratchKey machine(HKEY_LOCAL_MACHINE, L"SOFTWARE");
+    const std::wstring tree = machine.Sub(L"T");
+    MakeTree(HKEY_LOCAL_MACHINE, tree, 2, KEY_WOW64_64KEY);
+    ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, tree, L"view", L"32", 0));
+    EXPECT_TRUE(CRegistry::RecurDeleteKey(HKEY_LOCAL_MACHINE, tree.c_str(), KEY_WOW64_64KEY));
+    EXPECT_FALSE(RegHasKey(HKEY_LOCAL_MACHINE, tree, KEY_WOW64_64KEY));
+    EXPECT_TRUE(RegHasValue(HKEY_LOCAL_MACHINE, tree, L"view", 0));
+}
+
+TEST_F(RegistryDeleteTest, EmptyAndNullNamesNeverDeleteTheRootOrTheParent) {
+    const std::wstring tree = m_user.Sub(L"T");
+    MakeTree(kUser, tree, 1);
+    // A scratch key as the root: if an empty name were taken as "the root
+    // itself", only scratch keys would be lost.
+    UniqueHKey base;
+    ASSERT_EQ(ERROR_SUCCESS,
+              RegOpenKeyExW(kUser, m_user.path().c_str(), 0, KEY_ALL_ACCESS, base.put()));
+    EXPECT_FALSE(CRegistry::RecurDeleteKey(base.get(), L"", 0));
+    EXPECT_FALSE(CRegistry::RecurDeleteKey(base.get(), nullptr, 0));
+    EXPECT_FALSE(RecursDeleteRegisterKey(kUser, tree.c_str(), L""));  // the parent itself
+    EXPECT_FALSE(RecursDeleteRegisterKey(kUser, tree.c_str(), nullptr));
+    EXPECT_TRUE(Has(L"T\\b"));
 }
 
 }  // namespace
