@@ -1,0 +1,110 @@
+#include "actions/page_island.h"
+
+#include "base/com_owners.h"
+
+namespace {
+
+// HTML and BODY elements nested deeper than this are not searched: a hostile
+// page could otherwise exhaust the stack, one browser call after another.
+const int kMaxIslandDepth = 64;
+
+CStringEx TagName(IHTMLElement* element) {
+    UniqueBstr tag;
+    if (FAILED(element->get_tagName(tag.put())) || tag.get() == nullptr) {
+        return CStringEx();
+    }
+    return CStringEx(tag.get());
+}
+
+bool SearchElement(IHTMLElement* element, const CStringEx& tag, CStringEx& island, int depth);
+
+bool SearchChildren(IHTMLElement* element, CStringEx& island, int depth) {
+    if (depth >= kMaxIslandDepth) {
+        return false;
+    }
+    ComPtr<IDispatch> childrenDispatch;
+    if (FAILED(element->get_children(childrenDispatch.GetAddressOf())) || !childrenDispatch) {
+        return false;
+    }
+    ComPtr<IHTMLElementCollection> children;
+    if (FAILED(childrenDispatch.As(&children)) || !children) {
+        return false;
+    }
+    long count = 0;
+    if (FAILED(children->get_length(&count))) {
+        return false;
+    }
+    for (long i = count - 1; i >= 0; --i) {
+        VARIANT index;
+        VariantInit(&index);
+        index.vt = VT_I4;
+        index.lVal = i;
+        ComPtr<IDispatch> childDispatch;
+        if (FAILED(children->item(index, index, childDispatch.GetAddressOf())) || !childDispatch) {
+            continue;
+        }
+        ComPtr<IHTMLElement> child;
+        if (FAILED(childDispatch.As(&child)) || !child) {
+            continue;
+        }
+        CStringEx childTag = TagName(child.Get());
+        if (childTag.IsEmpty() || childTag.CompareNoCase(L"FORM") == 0) {
+            continue;
+        }
+        if (SearchElement(child.Get(), childTag, island, depth + 1)) {
+            return true;
+        }
+    }
+    return false;
+}
+
+bool SearchElement(IHTMLElement* element, const CStringEx& tag, CStringEx& island, int depth) {
+    if (tag.CompareNoCase(L"xml") == 0) {
+        UniqueBstr inner;
+        element->get_innerHTML(inner.put());
+        island = inner.get() != nullptr ? CStringEx(inner.get()) : CStringEx();
+        return true;
+    }
+    if (tag.CompareNoCase(L"Body") == 0 || tag.CompareNoCase(L"HTML") == 0) {
+        return SearchChildren(element, island, depth);
+    }
+    return false;
+}
+
+}  // namespace
+
+bool FindXmlIsland(IHTMLElement* element, CStringEx& island) {
+    if (element == nullptr) {
+        return false;
+    }
+    CStringEx tag = TagName(element);
+    if (tag.IsEmpty()) {
+        return false;
+    }
+    return SearchElement(element, tag, island, 0);
+}
+
+bool ReadPageIsland(IWebBrowserApp* browser, bool busyMeansNotReady, CStringEx& island) {
+    if (browser == nullptr) {
+        return false;
+    }
+    if (busyMeansNotReady) {
+        VARIANT_BOOL busy = VARIANT_FALSE;
+        if (SUCCEEDED(browser->get_Busy(&busy)) && busy != VARIANT_FALSE) {
+            return false;
+        }
+    }
+    ComPtr<IDispatch> document;
+    if (FAILED(browser->get_Document(document.GetAddressOf())) || !document) {
+        return false;
+    }
+    ComPtr<IHTMLDocument3> document3;
+    if (FAILED(document.As(&document3)) || !document3) {
+        return false;
+    }
+    ComPtr<IHTMLElement> root;
+    if (FAILED(document3->get_documentElement(root.GetAddressOf())) || !root) {
+        return false;
+    }
+    return FindXmlIsland(root.Get(), island);
+}
