@@ -2,6 +2,8 @@
 
 #include <cwctype>
 
+#include "tests/fakes/common/fake_recorder.h"
+
 namespace {
 
 std::wstring ReadUtf8File(const std::wstring& path) {
@@ -114,15 +116,20 @@ void PageScript::ParseTree(const std::wstring& text) {
     }
 }
 
-DWORD PageScript::Elapsed() const {
-    return Navigated() ? GetTickCount() - m_navigatedAt : 0;
+void PageScript::StartClock() {
+    m_navigatedAt = fake::CounterMilliseconds();
+    m_navigated = true;
+}
+
+double PageScript::Elapsed() const {
+    return m_navigated ? fake::CounterMilliseconds() - m_navigatedAt : 0;
 }
 
 bool PageScript::IslandText(int island, std::wstring& text) const {
     if (!Navigated() || island < 0) {
         return false;
     }
-    DWORD now = Elapsed();
+    double now = Elapsed();
     bool due = false;
     for (const IslandStep& step : m_islands) {
         if (step.atMs <= now && (step.island == -1 || step.island == island)) {
