@@ -8,7 +8,7 @@
 #include <string>
 
 #include "bench/process_timing.h"
-#include "tests/support/call_stamps.h"
+#include "tests/fakes/common/call_stamps.h"
 #include "tests/support/file_util.h"
 #include "tests/support/program_run.h"
 #include "tests/support/scratch_dir.h"
@@ -34,7 +34,7 @@ double StartToCall(const std::wstring& exe, const std::wstring& callsLog) {
     WaitForSingleObject(process.hProcess, 60000);
     CloseHandle(process.hThread);
     CloseHandle(process.hProcess);
-    double called = CallStamp(ReadFileBytes(callsLog), "JoinMeeting");
+    double called = fake::CallStamp(ReadFileBytes(callsLog), "JoinMeeting");
     return called < 0 ? -1 : called - start;
 }
 

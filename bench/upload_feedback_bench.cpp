@@ -10,9 +10,9 @@
 #include <string>
 
 #include "bench/process_timing.h"
+#include "tests/fakes/caller/feedback_receiver.h"
+#include "tests/fakes/common/call_stamps.h"
 #include "tests/support/browser_standin.h"
-#include "tests/support/call_stamps.h"
-#include "tests/support/feedback_receiver.h"
 #include "tests/support/program_run.h"
 #include "tests/support/scratch_dir.h"
 
@@ -21,11 +21,9 @@ namespace {
 const double kGoalMs = 100.0;
 const int kIslandDelayMs = 300;
 
-void RunProgram(const std::wstring& exe, const std::wstring& arguments,
-                const std::wstring& pageScript) {
+void RunProgram(const std::wstring& exe, const std::wstring& arguments) {
     std::wstring line = L"\"" + exe + L"\" " + arguments;
-    std::vector<wchar_t> environment =
-        BuildEnvironmentBlock({{L"QM_FAKE_PAGE_SCRIPT", pageScript}, {L"QM_FAKE_TRACE_LOG", L""}});
+    std::vector<wchar_t> environment = BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", L""}});
     STARTUPINFOW startup = {};
     startup.cb = sizeof(startup);
     PROCESS_INFORMATION process = {};
@@ -51,9 +49,9 @@ Series Measure(const char* name, BrowserServer server, int runs) {
         browser.SetPage("stamp\nisland " + std::to_string(kIslandDelayMs) +
                         " <r><Status>success</Status><CD>12345</CD></r>\n");
         size_t before = receiver.Received().size();
-        RunProgram(program.exePath(), arguments, browser.scriptPath());
+        RunProgram(program.exePath(), arguments);
         std::vector<CopyData> received = receiver.Received();
-        double navigated = CallStamp(browser.Calls(), "Navigate");
+        double navigated = fake::CallStamp(browser.Calls(), "Navigate");
         if (received.size() != before + 1 || navigated < 0) {
             printf("  run %d of %s delivered no feedback\n", i, name);
             continue;

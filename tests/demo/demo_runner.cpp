@@ -9,7 +9,7 @@
 #include <cstdio>
 #include <string>
 
-#include "tests/support/feedback_receiver.h"
+#include "tests/fakes/caller/feedback_receiver.h"
 #include "tests/support/file_util.h"
 #include "tests/support/program_run.h"
 
@@ -59,7 +59,7 @@ int wmain(int argc, wchar_t** argv) {
         }
         std::vector<CopyData> messages = caller.Received();
         for (size_t m = received; m < messages.size(); ++m) {
-            printf("  WM_COPYDATA to the caller: %s\n", Narrow(messages[m].Text()).c_str());
+            printf("  WM_COPYDATA to the caller: %s\n", Narrow(messages[m].text).c_str());
         }
         printf("  exit code: %d\n", run.exitCode);
         fflush(stdout);

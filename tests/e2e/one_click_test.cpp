@@ -1,6 +1,6 @@
 // One-click Actions end to end: the program loads the one-click library
 // stand-in from its folder, calls the Action's method with the top-level
-// window under the mouse cursor, and releases and unloads it.
+// window under the mouse cursor, then releases and unloads it.
 #include <windows.h>
 #include <gtest/gtest.h>
 
@@ -13,63 +13,8 @@
 
 namespace {
 
-// Another program's window covering the screen, with a child control under
-// the mouse cursor. Its thread answers the messages sent to it.
-class WindowUnderCursor {
-public:
-    WindowUnderCursor() {
-        m_ready = CreateEventW(nullptr, TRUE, FALSE, nullptr);
-        m_thread = CreateThread(nullptr, 0, Thread, this, 0, nullptr);
-        WaitForSingleObject(m_ready, 10000);
-    }
-    ~WindowUnderCursor() {
-        PostMessageW(m_topLevel, WM_CLOSE, 0, 0);
-        WaitForSingleObject(m_thread, 10000);
-        CloseHandle(m_thread);
-        CloseHandle(m_ready);
-    }
-    std::string TopLevelText() const { return std::to_string(HandleToLong(m_topLevel)); }
-
-private:
-    static DWORD WINAPI Thread(void* self) {
-        auto* me = static_cast<WindowUnderCursor*>(self);
-        WNDCLASSW windowClass = {};
-        windowClass.lpfnWndProc = Proc;
-        windowClass.hInstance = GetModuleHandleW(nullptr);
-        windowClass.lpszClassName = L"QmTestMeetingClient";
-        RegisterClassW(&windowClass);
-        me->m_topLevel =
-            CreateWindowW(windowClass.lpszClassName, L"Meeting client", WS_POPUP | WS_VISIBLE, 0, 0,
-                          GetSystemMetrics(SM_CXSCREEN), GetSystemMetrics(SM_CYSCREEN), nullptr,
-                          nullptr, windowClass.hInstance, nullptr);
-        HWND panel = CreateWindowW(L"STATIC", L"", WS_CHILD | WS_VISIBLE, 50, 50, 400, 300,
-                                   me->m_topLevel, nullptr, windowClass.hInstance, nullptr);
-        CreateWindowW(L"BUTTON", L"Join", WS_CHILD | WS_VISIBLE, 100, 100, 200, 40, panel, nullptr,
-                      windowClass.hInstance, nullptr);
-        SetCursorPos(250, 270);  // over the button, inside the panel
-        SetEvent(me->m_ready);
-        MSG message;
-        while (GetMessageW(&message, nullptr, 0, 0) > 0) {
-            DispatchMessageW(&message);
-        }
-        return 0;
-    }
-    static LRESULT CALLBACK Proc(HWND window, UINT message, WPARAM wParam, LPARAM lParam) {
-        if (message == WM_DESTROY) {
-            PostQuitMessage(0);
-        }
-        return DefWindowProcW(window, message, wParam, lParam);
-    }
-
-    HANDLE m_thread = nullptr;
-    HANDLE m_ready = nullptr;
-    HWND m_topLevel = nullptr;
-};
-
 class OneClickTest : public ::testing::Test {
 protected:
-    OneClickTest() : m_program(m_scratch.Sub(L"bin"), WithoutSuiteLibrary()) {}
-
     static ProgramOptions WithoutSuiteLibrary() {
         ProgramOptions options;
         options.withSuiteLibrary = false;  // its records would mix with the library's
@@ -82,13 +27,22 @@ protected:
     std::string Calls() { return ReadFileBytes(m_program.callsLogPath()); }
 
     ScratchDir m_scratch{L"oneclick"};
-    ProgramUnderTest m_program;
+    ProgramUnderTest m_program{m_scratch.Sub(L"bin"), WithoutSuiteLibrary()};
 };
 
 TEST_F(OneClickTest, EachActionCallsItsMethodWithTheTopLevelWindowUnderTheCursor) {
     InstallLibrary(L"qmMrvMS.DLL");
-    WindowUnderCursor client;
-    const std::string owner = client.TopLevelText();
+    // Another program's window over the screen, the cursor on a button
+    // inside a panel of it.
+    HWND client = CreateWindowW(L"STATIC", L"Meeting client", WS_POPUP | WS_VISIBLE, 0, 0,
+                                GetSystemMetrics(SM_CXSCREEN), GetSystemMetrics(SM_CYSCREEN),
+                                nullptr, nullptr, nullptr, nullptr);
+    HWND panel = CreateWindowW(L"STATIC", L"", WS_CHILD | WS_VISIBLE, 50, 50, 400, 300, client,
+                               nullptr, nullptr, nullptr);
+    CreateWindowW(L"BUTTON", L"Join", WS_CHILD | WS_VISIBLE, 100, 100, 200, 40, panel, nullptr,
+                  nullptr, nullptr);
+    SetCursorPos(250, 170);  // on the button
+    const std::string owner = std::to_string(HandleToLong(client));
     struct Row {
         const wchar_t* command;
         std::string calls;
@@ -114,6 +68,7 @@ TEST_F(OneClickTest, EachActionCallsItsMethodWithTheTopLevelWindowUnderTheCursor
         EXPECT_EQ(1, run.CountTraces("--> COneClickItemHandler::FreeOneClickObject \n"));
         EXPECT_EQ(1, run.CountTraces("<-- COneClickItemHandler::FreeOneClickObject \n"));
     }
+    DestroyWindow(client);
 }
 
 TEST_F(OneClickTest, WithoutTheOneClickObjectNothingIsCalledAndTheResultIsZero) {

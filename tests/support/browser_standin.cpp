@@ -1,51 +1,40 @@
 #include "tests/support/browser_standin.h"
 
+#include <windows.h>
+
 #include "tests/support/file_util.h"
-#include "tests/support/program_run.h"
 #include "tests/support/test_paths.h"
 
 namespace {
 
-const wchar_t kBrowserClassKey[] =
-    L"SOFTWARE\\Classes\\CLSID\\{0002DF01-0000-0000-C000-000000000046}";
-
-std::wstring ClassSubKey(const wchar_t* sub) {
-    return std::wstring(kBrowserClassKey) + L"\\" + sub;
-}
+const std::wstring kClassKey = L"SOFTWARE\\Classes\\CLSID\\{0002DF01-0000-0000-C000-000000000046}";
+const std::wstring kLocalServerKey = kClassKey + L"\\LocalServer32";
+const std::wstring kInprocServerKey = kClassKey + L"\\InprocServer32";
 
 }  // namespace
 
 BrowserStandIn::BrowserStandIn(const std::wstring& folder, BrowserServer server)
-    : m_script(JoinPath(folder, L"page.txt")), m_log(JoinPath(folder, L"browser.log")) {
-    MakeDirs(folder);
+    : m_script(JoinPath(folder, L"page.txt")),
+      m_log(JoinPath(folder, L"browser.log")),
+      m_localServer32(HKEY_LOCAL_MACHINE, kLocalServerKey, L""),
+      m_localServer64(HKEY_LOCAL_MACHINE, kLocalServerKey, L"", KEY_WOW64_64KEY) {
     SetPage("");
-    std::wstring localServer;
-    if (server == BrowserServer::kMissing) {
-        localServer = L"\"" + JoinPath(folder, L"no such browser.exe") + L"\"";
-    } else {
-        // Even an in-process registration keeps the local server pointing at
-        // the stand-in: Wine would otherwise start its own browser.
-        localServer = L"\"" + FakePath(L"iexplore.exe") + L"\" \"" + m_script + L"\"";
-    }
-    const std::wstring localKey = ClassSubKey(L"LocalServer32");
-    m_localServer32 = std::make_unique<RegValueGuard>(HKEY_LOCAL_MACHINE, localKey, L"");
-    m_localServer64 =
-        std::make_unique<RegValueGuard>(HKEY_LOCAL_MACHINE, localKey, L"", KEY_WOW64_64KEY);
+    // Wine would start its own browser from either view: both name ours.
+    std::wstring program = server == BrowserServer::kMissing ? JoinPath(folder, L"none.exe")
+                                                             : FakePath(L"iexplore.exe");
     for (REGSAM view : {REGSAM(0), REGSAM(KEY_WOW64_64KEY)}) {
-        RegPutString(HKEY_LOCAL_MACHINE, localKey, L"", localServer, view);
+        RegPutString(HKEY_LOCAL_MACHINE, kLocalServerKey, L"",
+                     L"\"" + program + L"\" \"" + m_script + L"\"", view);
     }
     if (server == BrowserServer::kInProcess) {
-        RegPutString(HKEY_LOCAL_MACHINE, ClassSubKey(L"InprocServer32"), L"",
-                     FakePath(L"iexplore_inproc.dll"));
+        RegPutString(HKEY_LOCAL_MACHINE, kInprocServerKey, L"", FakePath(L"iexplore_inproc.dll"));
+        SetEnvironmentVariableW(L"QM_FAKE_PAGE_SCRIPT", m_script.c_str());
     }
 }
 
 BrowserStandIn::~BrowserStandIn() {
-    RegRemoveTree(HKEY_LOCAL_MACHINE, ClassSubKey(L"InprocServer32"));
-}
-
-void BrowserStandIn::ServeTo(ProgramUnderTest& program) const {
-    program.SetEnv(L"QM_FAKE_PAGE_SCRIPT", m_script);
+    RegRemoveTree(HKEY_LOCAL_MACHINE, kInprocServerKey);
+    SetEnvironmentVariableW(L"QM_FAKE_PAGE_SCRIPT", nullptr);
 }
 
 void BrowserStandIn::SetPage(const std::string& lines) const {

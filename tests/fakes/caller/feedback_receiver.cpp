@@ -1,19 +1,17 @@
-#include "tests/support/feedback_receiver.h"
+#include "tests/fakes/caller/feedback_receiver.h"
 
-#include <cstring>
+#include "tests/fakes/common/fake_recorder.h"
 
-double CounterMilliseconds() {
-    LARGE_INTEGER now, frequency;
-    QueryPerformanceCounter(&now);
-    QueryPerformanceFrequency(&frequency);
-    return static_cast<double>(now.QuadPart) * 1000.0 / static_cast<double>(frequency.QuadPart);
-}
+namespace {
 
-std::wstring CopyData::Text() const {
-    std::wstring text(bytes.size() / sizeof(wchar_t), L'\0');
-    memcpy(&text[0], bytes.data(), text.size() * sizeof(wchar_t));
+const unsigned char kFill = 0xA5;
+
+std::wstring TextUpToTerminator(const void* data, size_t bytes) {
+    std::wstring text(static_cast<const wchar_t*>(data), bytes / sizeof(wchar_t));
     return text.substr(0, text.find(L'\0'));
 }
+
+}  // namespace
 
 FeedbackWindow::FeedbackWindow() {
     m_ready = CreateEventW(nullptr, TRUE, FALSE, nullptr);
@@ -28,10 +26,6 @@ FeedbackWindow::~FeedbackWindow() {
     CloseHandle(m_ready);
 }
 
-std::wstring FeedbackWindow::HandleText() const {
-    return std::to_wstring(HandleToLong(m_window));
-}
-
 std::vector<CopyData> FeedbackWindow::Received() const {
     std::lock_guard<std::mutex> hold(m_lock);
     return m_received;
@@ -42,7 +36,7 @@ DWORD WINAPI FeedbackWindow::Thread(void* self) {
     WNDCLASSW windowClass = {};
     windowClass.lpfnWndProc = Proc;
     windowClass.hInstance = GetModuleHandleW(nullptr);
-    windowClass.lpszClassName = L"QmTestFeedbackReceiver";
+    windowClass.lpszClassName = L"QmFakeFeedbackReceiver";
     RegisterClassW(&windowClass);
     receiver->m_window = CreateWindowW(windowClass.lpszClassName, L"", WS_OVERLAPPED, 0, 0, 10, 10,
                                        nullptr, nullptr, windowClass.hInstance, nullptr);
@@ -57,15 +51,11 @@ DWORD WINAPI FeedbackWindow::Thread(void* self) {
 
 LRESULT CALLBACK FeedbackWindow::Proc(HWND window, UINT message, WPARAM wParam, LPARAM lParam) {
     if (message == WM_COPYDATA) {
-        double now = CounterMilliseconds();
+        const auto* data = reinterpret_cast<const COPYDATASTRUCT*>(lParam);
+        CopyData copy{data->dwData, data->cbData, TextUpToTerminator(data->lpData, data->cbData),
+                      fake::CounterMilliseconds()};
         auto* receiver =
             reinterpret_cast<FeedbackWindow*>(GetWindowLongPtrW(window, GWLP_USERDATA));
-        const auto* data = reinterpret_cast<const COPYDATASTRUCT*>(lParam);
-        CopyData copy;
-        copy.dwData = data->dwData;
-        copy.cbData = data->cbData;
-        copy.bytes.assign(static_cast<const char*>(data->lpData), data->cbData);
-        copy.receivedMs = now;
         std::lock_guard<std::mutex> hold(receiver->m_lock);
         receiver->m_received.push_back(copy);
         return TRUE;
@@ -76,40 +66,27 @@ LRESULT CALLBACK FeedbackWindow::Proc(HWND window, UINT message, WPARAM wParam, 
     return DefWindowProcW(window, message, wParam, lParam);
 }
 
-SharedFeedbackMemory::SharedFeedbackMemory(DWORD size, unsigned char fill)
-    : m_size(size), m_fill(fill) {
+SharedFeedbackMemory::SharedFeedbackMemory(DWORD size) : m_size(size) {
     m_mapping =
         CreateFileMappingW(INVALID_HANDLE_VALUE, nullptr, PAGE_READWRITE, 0, size, L"MRVPPUINFO");
     m_view = static_cast<unsigned char*>(MapViewOfFile(m_mapping, FILE_MAP_ALL_ACCESS, 0, 0, size));
     if (m_view != nullptr) {
-        memset(m_view, fill, size);
+        memset(m_view, kFill, size);
     }
 }
 
 SharedFeedbackMemory::~SharedFeedbackMemory() {
-    if (m_view != nullptr) {
-        UnmapViewOfFile(m_view);
-    }
-    if (m_mapping != nullptr) {
-        CloseHandle(m_mapping);
-    }
+    UnmapViewOfFile(m_view);
+    CloseHandle(m_mapping);
 }
 
 std::wstring SharedFeedbackMemory::Text() const {
-    if (m_view == nullptr) {
-        return std::wstring();
-    }
-    const auto* text = reinterpret_cast<const wchar_t*>(m_view);
-    size_t length = 0;
-    while ((length + 1) * sizeof(wchar_t) <= m_size && text[length] != L'\0') {
-        ++length;
-    }
-    return std::wstring(text, length);
+    return m_view ? TextUpToTerminator(m_view, m_size) : std::wstring();
 }
 
-bool SharedFeedbackMemory::FillIntactFrom(size_t offset) const {
+bool SharedFeedbackMemory::UntouchedFrom(size_t offset) const {
     for (size_t i = offset; m_view != nullptr && i < m_size; ++i) {
-        if (m_view[i] != m_fill) {
+        if (m_view[i] != kFill) {
             return false;
         }
     }

@@ -1,6 +1,6 @@
-// The two ways a suite program receives the feedback of an upload page: a
-// window that records the WM_COPYDATA messages it is sent (it runs on a
-// thread of its own, so a sender is answered while the test waits for the
+// Stand-in for the suite program that starts an upload page and receives its
+// feedback: a window that records the WM_COPYDATA messages it is sent (on a
+// thread of its own, so a sender is answered while the host waits for the
 // program), and the shared memory "MRVPPUINFO" of a chosen size.
 #pragma once
 
@@ -13,11 +13,8 @@
 struct CopyData {
     ULONG_PTR dwData = 0;
     DWORD cbData = 0;
-    std::string bytes;
-    double receivedMs = 0;  // on the machine-wide performance counter
-
-    // The bytes as UTF-16 text, up to the first terminator.
-    std::wstring Text() const;
+    std::wstring text;      // the data as UTF-16, up to its first terminator
+    double receivedMs = 0;  // fake::CounterMilliseconds
 };
 
 class FeedbackWindow {
@@ -27,9 +24,8 @@ public:
     FeedbackWindow(const FeedbackWindow&) = delete;
     FeedbackWindow& operator=(const FeedbackWindow&) = delete;
 
-    HWND window() const { return m_window; }
     // The handle as a command's hWnd element gives it.
-    std::wstring HandleText() const;
+    std::wstring HandleText() const { return std::to_wstring(HandleToLong(m_window)); }
     std::vector<CopyData> Received() const;
 
 private:
@@ -43,25 +39,21 @@ private:
     std::vector<CopyData> m_received;
 };
 
-// "MRVPPUINFO" of `size` bytes, every byte `fill` to begin with.
+// "MRVPPUINFO" of `size` bytes, each 0xA5 to begin with.
 class SharedFeedbackMemory {
 public:
-    explicit SharedFeedbackMemory(DWORD size, unsigned char fill = 0xA5);
+    explicit SharedFeedbackMemory(DWORD size);
     ~SharedFeedbackMemory();
     SharedFeedbackMemory(const SharedFeedbackMemory&) = delete;
     SharedFeedbackMemory& operator=(const SharedFeedbackMemory&) = delete;
 
     // The UTF-16 text at the start, up to its terminator.
     std::wstring Text() const;
-    // Bytes from offset to the end that still hold the fill.
-    bool FillIntactFrom(size_t offset) const;
+    // The bytes from offset to the end still hold 0xA5.
+    bool UntouchedFrom(size_t offset) const;
 
 private:
     HANDLE m_mapping = nullptr;
     unsigned char* m_view = nullptr;
     DWORD m_size;
-    unsigned char m_fill;
 };
-
-// Milliseconds on the machine-wide performance counter.
-double CounterMilliseconds();
