@@ -21,6 +21,22 @@ const int kMaxParentWalk = 256;
 
 using DllGetClassObjectFn = HRESULT(STDAPICALLTYPE*)(REFCLSID, REFIID, void**);
 
+// The methods that take the owner window alone, by Action.
+struct OwnerMethod {
+    int nAction;
+    HRESULT (STDMETHODCALLTYPE IOneClickItems::*method)(long hwndOwner);
+};
+const OwnerMethod kOwnerMethods[] = {
+    {kActionOpenAbout, &IOneClickItems::OpenAbout},
+    {kActionOpenHelp, &IOneClickItems::OpenHelp},
+    {kActionStartOCMeeting, &IOneClickItems::StartOCMeeting},
+    {kActionStartAudioOnly, &IOneClickItems::StartAudioOnly},
+    {kActionStartScheduledMeeting, &IOneClickItems::StartScheduledMeeting},
+    {kActionJoinMeeting, &IOneClickItems::JoinMeeting},
+    {kActionOpenQMSetting, &IOneClickItems::OpenQMSetting},
+    {kActionScheduleMeeting, &IOneClickItems::ScheduleMeeting},
+};
+
 long WindowArgument(HWND window) {
     return HandleToLong(window);
 }
@@ -88,42 +104,23 @@ void COneClickItemHandler::FreeOneClickObject() {
 
 bool COneClickItemHandler::CallActionMethod(int nAction) {
     IOneClickItems* items = m_spOneClickItems.Get();
-    switch (nAction) {
-        case kActionOpenAbout:
-            items->OpenAbout(WindowArgument(OwnerWindowUnderCursor()));
-            return true;
-        case kActionOpenHelp:
-            items->OpenHelp(WindowArgument(OwnerWindowUnderCursor()));
-            return true;
-        case kActionShareWindow: {
-            // The owner is looked up anew for each argument.
-            long owner = WindowArgument(OwnerWindowUnderCursor());
-            long shared = WindowArgument(OwnerWindowUnderCursor());
-            items->ShareWindow(owner, shared);
+    if (nAction == kActionShareWindow) {
+        // The owner is looked up anew for each argument.
+        long owner = WindowArgument(OwnerWindowUnderCursor());
+        long shared = WindowArgument(OwnerWindowUnderCursor());
+        items->ShareWindow(owner, shared);
+        return true;
+    }
+    for (const OwnerMethod& entry : kOwnerMethods) {
+        if (entry.nAction == nAction) {
+            (items->*entry.method)(WindowArgument(OwnerWindowUnderCursor()));
+            if (nAction == kActionStartScheduledMeeting) {
+                PumpMessagesFor(kScheduledMeetingWaitMs);
+            }
             return true;
         }
-        case kActionStartOCMeeting:
-            items->StartOCMeeting(WindowArgument(OwnerWindowUnderCursor()));
-            return true;
-        case kActionStartAudioOnly:
-            items->StartAudioOnly(WindowArgument(OwnerWindowUnderCursor()));
-            return true;
-        case kActionStartScheduledMeeting:
-            items->StartScheduledMeeting(WindowArgument(OwnerWindowUnderCursor()));
-            PumpMessagesFor(kScheduledMeetingWaitMs);
-            return true;
-        case kActionJoinMeeting:
-            items->JoinMeeting(WindowArgument(OwnerWindowUnderCursor()));
-            return true;
-        case kActionOpenQMSetting:
-            items->OpenQMSetting(WindowArgument(OwnerWindowUnderCursor()));
-            return true;
-        case kActionScheduleMeeting:
-            items->ScheduleMeeting(WindowArgument(OwnerWindowUnderCursor()));
-            return true;
-        default:
-            return false;
     }
+    return false;
 }
 
 int COneClickItemHandler::Handle(CommandInfo& commandInfo) {

@@ -8,6 +8,17 @@ namespace {
 // page could otherwise exhaust the stack, one browser call after another.
 const int kMaxIslandDepth = 64;
 
+// The object a browser call gave as IDispatch, as the interface T (null when
+// the call failed or the object has no such interface).
+template <typename T>
+ComPtr<T> ObjectAs(HRESULT hr, const ComPtr<IDispatch>& object) {
+    ComPtr<T> result;
+    if (SUCCEEDED(hr) && object) {
+        object.As(&result);
+    }
+    return result;
+}
+
 CStringEx TagName(IHTMLElement* element) {
     UniqueBstr tag;
     if (FAILED(element->get_tagName(tag.put())) || tag.get() == nullptr) {
@@ -22,12 +33,10 @@ bool SearchChildren(IHTMLElement* element, CStringEx& island, int depth) {
     if (depth >= kMaxIslandDepth) {
         return false;
     }
-    ComPtr<IDispatch> childrenDispatch;
-    if (FAILED(element->get_children(childrenDispatch.GetAddressOf())) || !childrenDispatch) {
-        return false;
-    }
-    ComPtr<IHTMLElementCollection> children;
-    if (FAILED(childrenDispatch.As(&children)) || !children) {
+    ComPtr<IDispatch> childrenObject;
+    HRESULT hr = element->get_children(childrenObject.GetAddressOf());
+    ComPtr<IHTMLElementCollection> children = ObjectAs<IHTMLElementCollection>(hr, childrenObject);
+    if (!children) {
         return false;
     }
     long count = 0;
@@ -39,12 +48,10 @@ bool SearchChildren(IHTMLElement* element, CStringEx& island, int depth) {
         VariantInit(&index);
         index.vt = VT_I4;
         index.lVal = i;
-        ComPtr<IDispatch> childDispatch;
-        if (FAILED(children->item(index, index, childDispatch.GetAddressOf())) || !childDispatch) {
-            continue;
-        }
-        ComPtr<IHTMLElement> child;
-        if (FAILED(childDispatch.As(&child)) || !child) {
+        ComPtr<IDispatch> childObject;
+        hr = children->item(index, index, childObject.GetAddressOf());
+        ComPtr<IHTMLElement> child = ObjectAs<IHTMLElement>(hr, childObject);
+        if (!child) {
             continue;
         }
         CStringEx childTag = TagName(child.Get());
@@ -94,16 +101,14 @@ bool ReadPageIsland(IWebBrowserApp* browser, bool busyMeansNotReady, CStringEx& 
             return false;
         }
     }
-    ComPtr<IDispatch> document;
-    if (FAILED(browser->get_Document(document.GetAddressOf())) || !document) {
-        return false;
-    }
-    ComPtr<IHTMLDocument3> document3;
-    if (FAILED(document.As(&document3)) || !document3) {
+    ComPtr<IDispatch> documentObject;
+    HRESULT hr = browser->get_Document(documentObject.GetAddressOf());
+    ComPtr<IHTMLDocument3> document = ObjectAs<IHTMLDocument3>(hr, documentObject);
+    if (!document) {
         return false;
     }
     ComPtr<IHTMLElement> root;
-    if (FAILED(document3->get_documentElement(root.GetAddressOf())) || !root) {
+    if (FAILED(document->get_documentElement(root.GetAddressOf())) || !root) {
         return false;
     }
     return FindXmlIsland(root.Get(), island);
