@@ -10,24 +10,6 @@ namespace {
 const char kSharedSite[] = "file:../shared/eclipse/";
 const char kNestedSharedSite[] = "file:../../shared/eclipse/";
 const char kEmbeddedSite[] = "platform:/config/../applications/eclipse/";
-// The feature element as the program writes it (attributes in this order).
-const char kFeatureElement[] =
-    "<feature id=\"com.mrv.realtime.meeting.feature\" "
-    "url=\"features/com.mrv.realtime.meeting.feature_1.0.1/\" version=\"1.0.1\"";
-
-// A platform.xml with a base site and a second site at siteUrl holding
-// another feature and then `features`.
-std::string PlatformXml(const std::string& siteUrl, const std::string& features = "") {
-    return "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<config version=\"3.0\">\n"
-           "<site enabled=\"true\" url=\"platform:/base/\">\n"
-           "<feature id=\"org.eclipse.rcp\" url=\"features/org.eclipse.rcp_3.4.0/\" "
-           "version=\"3.4.0\">\n</feature>\n</site>\n<site enabled=\"true\" url=\"" +
-           siteUrl +
-           "\">\n<feature id=\"com.example.chat\" url=\"features/com.example.chat_8.0.0/\" "
-           "version=\"8.0.0\">\n</feature>\n" +
-           features + "</site>\n</config>\n";
-}
-
 std::string BillionLaughs(const std::string& site) {
     std::string text = "<?xml version=\"1.0\"?>\n<!DOCTYPE config [\n<!ENTITY a0 \"lol\">\n";
     for (int i = 1; i <= 9; ++i) {

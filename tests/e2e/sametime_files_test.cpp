@@ -101,12 +101,14 @@ TEST_F(SametimeFilesE2E, Sametime7LayoutAndAStopAtItsLockedLibrary) {
 
     HeldOpen locked(In(m_sametime, L"native", kNativeLibrary), FILE_SHARE_READ);
     ASSERT_TRUE(locked.ok());
-    SetMachinePath(m_suite + L"\\");
+    SetMachinePath(m_suite);
     RunResult run = Program().Run(L"-delsametimefilesEx");
     EXPECT_EQ(0, run.exitCode);
     EXPECT_TRUE(run.HasTrace(" CQMCommon::RemoveSametimePluginFiles: DeleteFile Failed!\n,\n"));
     EXPECT_TRUE(FileExists(In(m_sametime, L"plugins", kJar)));
-    EXPECT_EQ(L"", MachinePath());  // the folder was its only entry
+    // The suite folder as the only entry stays: an empty machine Path is never written.
+    EXPECT_EQ(m_suite, RegGetString(HKEY_LOCAL_MACHINE, kEnvironmentKey, L"Path").value_or(L""));
+    EXPECT_TRUE(run.HasTraceContaining("the Path would be empty, left as it is"));
 }
 
 TEST_F(SametimeFilesE2E, CopyNeverWritesForAFailedLookup) {

@@ -15,6 +15,23 @@ const wchar_t kRuntimeC[] = L"msvcr120.dll";
 const wchar_t kJar[] = L"com.mrv.realtime.meeting_1.0.1.jar";
 const wchar_t kFeatureXml[] = L"com.mrv.realtime.meeting.feature_1.0.1\\feature.xml";
 const char kFeatureId[] = "id=\"com.mrv.realtime.meeting.feature\"";
+// The feature element as the program writes it (attributes in this order).
+const char kFeatureElement[] =
+    "<feature id=\"com.mrv.realtime.meeting.feature\" "
+    "url=\"features/com.mrv.realtime.meeting.feature_1.0.1/\" version=\"1.0.1\"";
+
+// A platform.xml with a base site and a second site at siteUrl holding
+// another feature and then `features`.
+inline std::string PlatformXml(const std::string& siteUrl, const std::string& features = "") {
+    return "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<config version=\"3.0\">\n"
+           "<site enabled=\"true\" url=\"platform:/base/\">\n"
+           "<feature id=\"org.eclipse.rcp\" url=\"features/org.eclipse.rcp_3.4.0/\" "
+           "version=\"3.4.0\">\n</feature>\n</site>\n<site enabled=\"true\" url=\"" +
+           siteUrl +
+           "\">\n<feature id=\"com.example.chat\" url=\"features/com.example.chat_8.0.0/\" "
+           "version=\"8.0.0\">\n</feature>\n" +
+           features + "</site>\n</config>\n";
+}
 
 inline size_t CountOf(const std::string& text, const std::string& part) {
     size_t count = 0;

@@ -13,7 +13,8 @@ namespace {
 
 const wchar_t kUninstallKey[] = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall";
 
-// Every key, value and per-user folder the simulated products use.
+}  // namespace
+
 void ClearProductState() {
     for (REGSAM view : {REGSAM(0), REGSAM(KEY_WOW64_64KEY)}) {
         for (const wchar_t* key : {L"SOFTWARE\\Mirovan", L"SOFTWARE\\Lotus",
@@ -56,8 +57,6 @@ void ClearProductState() {
         RemoveTree(JoinPath(RoamingAppData(), folder));
     }
 }
-
-}  // namespace
 
 std::wstring RoamingAppData() {
     wchar_t path[MAX_PATH] = {};

@@ -19,6 +19,8 @@ extern const wchar_t kSessionManagerKey[];  // holds PendingFileRenameOperations
 // Uninstall entries that tests create are named with this prefix.
 extern const wchar_t kTestUninstallPrefix[];
 
+// Removes every key, value and per-user folder the simulated products use.
+void ClearProductState();
 // The user's roaming application-data folder of this prefix.
 std::wstring RoamingAppData();
 
