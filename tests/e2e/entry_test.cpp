@@ -63,11 +63,10 @@ TEST_F(EntryTest, CommandLinesChooseTheirMode) {
         {L"- deleteregfeaturecontrol", {entry + "- deleteregfeaturecontrol,\n"}},
         {L"", {entry + ",\n"}},
         // An Action command starts at "<CmdLine>"; its names are case-sensitive.
-        {L"xyz <CmdLine><Action>OpenHelp</Action></CmdLine>", {parse, parsed}},
+        {L"xyz <CmdLine><Action>openhelp</Action></CmdLine>",
+         {parse, parsed, " Parse cmdline Error,\n"}},
         {L"<cmdline><Action>OpenHelp</Action></cmdline>",
          {entry + "<cmdline><Action>OpenHelp</Action></cmdline>,\n"}},
-        {L"<CmdLine><Action>openhelp</Action></CmdLine>",
-         {parse, parsed, " Parse cmdline Error,\n"}},
         {L"<CmdLine>", {parse, parsed, " Parse cmdline Error,\n"}},
     };
     for (const auto& c : cases) {
