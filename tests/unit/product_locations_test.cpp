@@ -66,8 +66,10 @@ TEST_F(LocationsTest, ValueMustFitTheBufferWithItsTerminator) {
             HKEY key = nullptr;
             ASSERT_EQ(ERROR_SUCCESS, RegCreateKeyExW(kMachine, kSuiteKey, 0, nullptr, 0, KEY_WRITE,
                                                      nullptr, &key, nullptr));
-            RegSetValueExW(key, L"Path", 0, REG_SZ, reinterpret_cast<const BYTE*>(value.c_str()),
-                           static_cast<DWORD>(bytes));
+            // Wine counts a terminator into the size of a REG_SZ stored without one;
+            // a binary value shows the bare bytes, as Windows reads such a REG_SZ.
+            RegSetValueExW(key, L"Path", 0, terminated ? REG_SZ : REG_BINARY,
+                           reinterpret_cast<const BYTE*>(value.c_str()), static_cast<DWORD>(bytes));
             RegCloseKey(key);
             Buffer buffer;
             EXPECT_EQ(chars < 260, GetQMInstallPath(buffer.text, buffer.capacity));
