@@ -7,6 +7,7 @@
 #include <string>
 
 #include "tests/support/file_util.h"
+#include "tests/support/held_files.h"
 #include "tests/support/machine_fixture.h"
 #include "tests/support/test_paths.h"
 
@@ -102,7 +103,11 @@ TEST_F(InstallerRegistrationTest, UnregisteredCodeIsLoggedAndTheMachineCopyStill
     RegMakeKey(kUser, kUserInstaller + L"Products");
     Register(kMachine, kOutlookCode, kFirst, true);
     RegMakeKey(kMachine, kCopies + kOutlookCode);
+    const size_t pending = PendingDeleteCount();
     RunResult run = Program().Run(L"-uninstalloldoi");
+    // The old Outlook integration's class is not registered: no file is touched.
+    EXPECT_TRUE(run.HasTrace(" RemoveOldOIInstallFiles: GetOldOIInstallPath FAILED!\n,\n"));
+    EXPECT_EQ(pending, PendingDeleteCount());
     EXPECT_TRUE(run.HasTrace(" DelInstallerKeyByUpgrade: Delete Current user key!\n,\n"));
     EXPECT_TRUE(run.HasTrace(" DelInstallerKeyByUpgrade : hCurKey = -2147483647\n,\n"));
     EXPECT_TRUE(
