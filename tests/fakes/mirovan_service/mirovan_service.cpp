@@ -3,7 +3,7 @@
 //   mirovan_service.exe <calls log> <wait hint ms> <polls | never>
 // On the stop request it reports SERVICE_STOP_PENDING with that wait hint and
 // reaches SERVICE_STOPPED half a wait hint before the caller's given number of
-// polls is over, or never. Setting the event "QMFakeMirovanServiceRelease"
+// polls is over, or never. Setting the event "Global\QMFakeMirovanServiceRelease"
 // stops it at once in either case. Each step goes to the calls log.
 #include <windows.h>
 
@@ -14,7 +14,7 @@
 
 namespace {
 
-const wchar_t kReleaseEvent[] = L"QMFakeMirovanServiceRelease";
+const wchar_t kReleaseEvent[] = L"Global\\QMFakeMirovanServiceRelease";
 
 SERVICE_STATUS_HANDLE g_statusHandle = nullptr;
 SERVICE_STATUS g_status = {};
