@@ -1,12 +1,16 @@
 // Runs qmMrvONI.exe for the demo and prints what it did: the command line,
 // each trace record it wrote (level and text) and its exit code.
 //   demo_runner.exe <program folder> <arguments>...
-// Each further argument is one command line after the program name.
+// Each further argument is one command line after the program name. With
+// QM_DEMO_WATCH_HIVES set to user names (";" between them), it also shows
+// what those users' hives hold under SOFTWARE\Mirovan as the program unloads
+// them (Wine does not write a hive back to its file).
 #include <windows.h>
 
 #include <cstdio>
 #include <string>
 
+#include "tests/support/entry_stop.h"
 #include "tests/support/file_util.h"
 #include "tests/support/program_run.h"
 
@@ -26,6 +30,32 @@ void PrintRecordText(const std::string& text) {
     printf("%s", shown.c_str());
 }
 
+void PrintLoadedHives(const std::wstring& users) {
+    for (size_t start = 0; start < users.size();) {
+        size_t end = users.find(L';', start);
+        end = end == std::wstring::npos ? users.size() : end;
+        std::wstring key = users.substr(start, end - start) + L"\\SOFTWARE\\Mirovan";
+        start = end + 1;
+        HKEY mirovan = nullptr;
+        if (RegOpenKeyExW(HKEY_USERS, key.c_str(), 0, KEY_READ, &mirovan) != ERROR_SUCCESS) {
+            continue;
+        }
+        printf("  as the program unloads HKEY_USERS\\%s, SOFTWARE\\Mirovan holds:",
+               Narrow(key.substr(0, key.find(L'\\'))).c_str());
+        wchar_t name[256];
+        for (DWORD i = 0;; ++i) {
+            DWORD size = 256;
+            if (RegEnumKeyExW(mirovan, i, name, &size, nullptr, nullptr, nullptr, nullptr) !=
+                ERROR_SUCCESS) {
+                break;
+            }
+            printf(" %s", Narrow(name).c_str());
+        }
+        printf("\n");
+        RegCloseKey(mirovan);
+    }
+}
+
 }  // namespace
 
 int wmain(int argc, wchar_t** argv) {
@@ -41,9 +71,16 @@ int wmain(int argc, wchar_t** argv) {
         printf("\n$ qmMrvONI.exe %s\n", Narrow(arguments).c_str());
         DeleteFileW(traceLog.c_str());
         RunResult run;
+        wchar_t users[1024] = {};
+        GetEnvironmentVariableW(L"QM_DEMO_WATCH_HIVES", users, 1024);
+        EntryStop unload(reinterpret_cast<const void*>(
+                             GetProcAddress(GetModuleHandleW(L"advapi32.dll"), "RegUnLoadKeyW")),
+                         [&users] { PrintLoadedHives(users); });
+        DebuggeeHooks hooks;
+        hooks.stop = users[0] != L'\0' ? &unload : nullptr;
         RunAsDebuggee(L"\"" + program + L"\" " + arguments,
                       BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", traceLog}}), folder, 120000,
-                      &run);
+                      &run, hooks);
         for (const TraceRecord& record : ParseTraceLog(ReadFileBytes(traceLog))) {
             printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
             PrintRecordText(record.text);
