@@ -9,6 +9,7 @@
 #include "base/privileges.h"
 #include "base/registry.h"
 #include "base/registry_delete.h"
+#include "base/reparse_guard.h"
 #include "base/string_ex.h"
 #include "base/win_handles.h"
 #include "cleanup/user_registry_cleanup.h"
@@ -69,20 +70,23 @@ bool GetProfilesFolder(CStringEx& folder) {
     return true;
 }
 
-// A profile folder, not "." or "..", and no link (a junction or symbolic
-// link would lead the walk out of the profiles folder).
-bool IsProfileFolder(const WIN32_FIND_DATAW& entry) {
-    if (wcscmp(entry.cFileName, L".") == 0 || wcscmp(entry.cFileName, L"..") == 0) {
-        return false;
-    }
+// A folder of the profiles folder, not "." or "..". Linked folders (a
+// junction would lead the walk out of the profiles folder) are refused by the
+// caller.
+bool IsProfileFolderEntry(const WIN32_FIND_DATAW& entry) {
     return (entry.dwFileAttributes & FILE_ATTRIBUTE_DIRECTORY) != 0 &&
-           (entry.dwFileAttributes & FILE_ATTRIBUTE_REPARSE_POINT) == 0;
+           wcscmp(entry.cFileName, L".") != 0 && wcscmp(entry.cFileName, L"..") != 0;
 }
 
 void CleanProfileHive(const CStringEx& profiles, const wchar_t* user, const wchar_t* subkey,
                       const wchar_t* value1, const wchar_t* value2) {
+    CStringEx folder;
+    folder.Format(L"%s\\%s", profiles.c_str(), user);
+    if (!IsFreeOfReparsePoints(profiles.c_str(), folder.c_str())) {
+        return;
+    }
     CStringEx hiveFile;
-    hiveFile.Format(L"%s\\%s\\NTUSER.DAT", profiles.c_str(), user);
+    hiveFile.Format(L"%s\\NTUSER.DAT", folder.c_str());
     LoadedProfileHive hive(user, hiveFile.c_str());
     if (hive.result() != ERROR_SUCCESS) {
         // In use (a logged-on user's) or missing: skipped.
@@ -163,7 +167,7 @@ void DeleteAllCurUserReg(const wchar_t* subkey, const wchar_t* value1, const wch
         return;
     }
     do {
-        if (IsProfileFolder(entry)) {
+        if (IsProfileFolderEntry(entry)) {
             CleanProfileHive(profiles, entry.cFileName, subkey, value1, value2);
         }
     } while (FindNextFileW(walk.get(), &entry));

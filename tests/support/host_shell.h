@@ -1,7 +1,6 @@
 // Commands of the host, the Unix side of Wine, for what Windows calls cannot
-// do here: planting a host symbolic link (which Windows programs see as a
-// directory reparse point) and reading Wine's debug channels, which go to the
-// host's standard error of the process that started wine.
+// do here, such as reading Wine's debug channels: they go to the host's
+// standard error of the process that started wine.
 #pragma once
 
 #include <windows.h>
