@@ -1,6 +1,6 @@
 // What older releases left behind: the old Outlook integration's files (at the
-// next restart), the update leftovers, retired COM registrations, and the
-// 64-bit add-ins, unregistered for real by the 64-bit regsvr32.
+// next restart), update leftovers, retired COM registrations, and the 64-bit
+// add-ins, unregistered for real by the 64-bit regsvr32.
 #include <windows.h>
 #include <gtest/gtest.h>
 
@@ -15,20 +15,18 @@ namespace {
 
 const HKEY kMachine = HKEY_LOCAL_MACHINE;
 const std::wstring kOldServer = L"CLSID\\{061E7FF2-9750-46FB-AFD6-245CE0AB8549}";
-const std::wstring kClasses = L"SOFTWARE\\Classes\\";
 const std::wstring kToolbarClass = L"{90E2BA2E-DD1B-4cde-9134-7A8B86D33CA7}";
-// Retired COM registrations, each with something below it.
+const std::wstring kToolbar = L"SOFTWARE\\Microsoft\\Internet Explorer\\Toolbar";
 const std::wstring kRetired[] = {
-    kClasses + L"CLSID\\" + kToolbarClass,
-    kClasses + L"QmOneCli.MrvIEToolbar.1",
-    kClasses + L"QmOneCli.MrvIEToolbar",
+    L"SOFTWARE\\Classes\\CLSID\\" + kToolbarClass,
+    L"SOFTWARE\\Classes\\QmOneCli.MrvIEToolbar.1",
+    L"SOFTWARE\\Classes\\QmOneCli.MrvIEToolbar",
     L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Explorer\\Browser Helper Objects\\" +
         kToolbarClass,
-    kClasses + L"CLSID\\{0A4C50AC-AD3F-4245-B324-3C8696A3408A}",
-    kClasses + L"QmMrvst.MrvAction.1",
-    kClasses + L"QmMrvst.MrvAction",
+    L"SOFTWARE\\Classes\\CLSID\\{0A4C50AC-AD3F-4245-B324-3C8696A3408A}",
+    L"SOFTWARE\\Classes\\QmMrvst.MrvAction.1",
+    L"SOFTWARE\\Classes\\QmMrvst.MrvAction",
 };
-const std::wstring kToolbar = L"SOFTWARE\\Microsoft\\Internet Explorer\\Toolbar";
 
 class LegacyRemovalTest : public MachineTest {
 protected:
@@ -43,18 +41,16 @@ protected:
         RegRemoveValue(kMachine, kToolbar, kToolbarClass.c_str());
         RegRemoveValue(kMachine, kToolbar, L"QMTest-Neighbour");
     }
+    void AddAddin(const wchar_t* name) {
+        CopyFileW(FakePath(L"addin64.dll").c_str(), JoinPath(m_suite, name).c_str(), FALSE);
+    }
 
     const std::wstring m_suite;
 };
 
 TEST_F(LegacyRemovalTest, OldOutlookFilesAndTheFolderAbove327GoAtRestart) {
-    struct Row {
-        const wchar_t* folder;
-        const wchar_t* above;  // scheduled too, or null
-    };
-    for (const Row& row :
-         {Row{L"Mirovan\\327\\OI", L"Mirovan"}, Row{L"Other\\3270\\OI", nullptr}}) {
-        const std::wstring folder = m_scratch.Sub(row.folder, true);
+    for (const wchar_t* row : {L"Mirovan\\327\\OI", L"Other\\3270\\OI"}) {
+        const std::wstring folder = m_scratch.Sub(row, true);
         for (const wchar_t* name : {L"OI3Main.dll", L"mirovanoi.chm", L"notes.txt"}) {
             WriteFileBytes(JoinPath(folder, name), "old");
         }
@@ -65,12 +61,11 @@ TEST_F(LegacyRemovalTest, OldOutlookFilesAndTheFolderAbove327GoAtRestart) {
         EXPECT_TRUE(IsPendingDelete(folder + L"\\OI3Main.dll"));
         EXPECT_TRUE(IsPendingDelete(folder + L"\\mirovanoi.chm"));
         EXPECT_TRUE(IsPendingDelete(folder));
-        const bool above = row.above != nullptr;
-        if (above) {
-            EXPECT_TRUE(IsPendingDelete(m_scratch.Sub(row.above)));
-        }
-        // Only the named files that are there, the folder, and the folder above.
-        EXPECT_EQ(before + 3 + above, PendingDeleteCount()) << Narrow(row.folder);
+        // A folder named 327 above it goes too; one named 3270 is another folder.
+        const std::wstring top = row;
+        const bool above = IsPendingDelete(m_scratch.Sub(top.substr(0, top.find(L'\\'))));
+        EXPECT_EQ(row[0] == L'M', above);
+        EXPECT_EQ(before + 3 + above, PendingDeleteCount()) << Narrow(row);
     }
 }
 
@@ -85,9 +80,8 @@ TEST_F(LegacyRemovalTest, UpdateLeftoversRetiredClassesAndAddinsGo) {
     }
     RegPutString(kMachine, kToolbar, kToolbarClass.c_str(), L"");
     RegPutString(kMachine, kToolbar, L"QMTest-Neighbour", L"");
-    for (const wchar_t* addin : {L"qmolkadd64.dll", L"qmMrvst64.dll"}) {
-        CopyFileW(FakePath(L"addin64.dll").c_str(), JoinPath(m_suite, addin).c_str(), FALSE);
-    }
+    AddAddin(L"qmolkadd64.dll");
+    AddAddin(L"qmMrvst64.dll");
 
     // This one changes nothing at all.
     Program().Run(L"-deleteregfeaturecontrol");
@@ -96,22 +90,21 @@ TEST_F(LegacyRemovalTest, UpdateLeftoversRetiredClassesAndAddinsGo) {
     EXPECT_EQ(std::string::npos, ReadFileBytes(Program().callsLogPath()).find("Dll"));
 
     RunResult run = Program().Run(L"-delupdtemp");
-    EXPECT_EQ((std::vector<std::wstring>{L"components"}), ListDir(updTemp));
-    EXPECT_EQ((std::vector<std::wstring>{L"b.txt"}), ListDir(updTemp + L"\\components"));
+    EXPECT_EQ(std::vector<std::wstring>{L"components"}, ListDir(updTemp));
+    EXPECT_EQ(std::vector<std::wstring>{L"b.txt"}, ListDir(updTemp + L"\\components"));
     EXPECT_FALSE(FileExists(m_suite + L"\\x_upd_temp.dat"));
     for (const std::wstring& key : kRetired) {
         EXPECT_FALSE(RegHasKey(kMachine, key)) << Narrow(key);
     }
     EXPECT_FALSE(RegHasValue(kMachine, kToolbar, kToolbarClass.c_str()));
     EXPECT_TRUE(RegHasValue(kMachine, kToolbar, L"QMTest-Neighbour"));
-
-    // Each present add-in through the 64-bit regsvr32, in its own folder.
+    // Each add-in there through the 64-bit regsvr32, working in its folder.
     const std::string calls = ReadFileBytes(Program().callsLogPath());
     for (const wchar_t* addin : {L"qmolkadd64.dll", L"qmMrvst64.dll"}) {
         const std::string path = Narrow(JoinPath(m_suite, addin));
         EXPECT_NE(std::string::npos,
-                  calls.find(path + " DllUnregisterServer in " + Narrow(m_suite) + " by " +
-                             "C:\\windows\\system32\\regsvr32.exe /s /u \"" + path + "\""))
+                  calls.find(path + " DllUnregisterServer in " + Narrow(m_suite) +
+                             " by C:\\windows\\system32\\regsvr32.exe /s /u \"" + path + "\""))
             << calls;
     }
     EXPECT_TRUE(run.HasTrace(" RegQM64BitAddin: [" + Narrow(m_suite) +
@@ -123,8 +116,7 @@ TEST_F(LegacyRemovalTest, Regsvr32ThatCannotStartIsLoggedAndNoErrorBoxWaits) {
     ASSERT_NE(0u, GetSystemWow64DirectoryW(system, MAX_PATH));
     const std::wstring regsvr32 = JoinPath(system, L"regsvr32.exe");
     const std::wstring saved = regsvr32 + L".qmsaved";
-    CopyFileW(FakePath(L"addin64.dll").c_str(), JoinPath(m_suite, L"qmolkadd64.dll").c_str(),
-              FALSE);
+    AddAddin(L"qmolkadd64.dll");
     // Renamed, not rewritten: the prefix shares that file with its template.
     ASSERT_TRUE(MoveFileW(regsvr32.c_str(), saved.c_str()));
     WriteFileBytes(regsvr32, "not a program");

@@ -1,7 +1,6 @@
-// Holds a debuggee at the entry of one function of a system library while the
-// test looks at the machine: an int3 at the entry, stepped over and set again
-// after each stop. System libraries sit at the same address in every 32-bit
-// process of a prefix; the stop checks that the debuggee's code there matches.
+// Holds a debuggee at the entry of a function of a system library (mapped at
+// the same address in every 32-bit process of a prefix) while the test looks
+// at the machine: an int3 there, stepped over and set again after each stop.
 #pragma once
 
 #include <windows.h>
