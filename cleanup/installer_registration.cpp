@@ -63,13 +63,16 @@ CStringEx BracedCode(const wchar_t* packedCode) {
     return CStringEx(braced);
 }
 
-// One registration, the console user's (logged) or the machine's (silent):
-// the listed products, then the upgrade-code key itself.
-void DelRegistrationByUpgrade(HKEY root, const wchar_t* installerPath, const wchar_t* upgradeSubkey,
-                              bool logged) {
+// One registration below root\installerPath: remove(installer key, code) for
+// each product listed under the upgrade code, then the upgrade-code key itself
+// (which fails harmlessly while it still has subkeys). Failures are logged
+// for `operation`, or silently passed over when it is null.
+template <typename Remove>
+void RemoveRegistration(HKEY root, const wchar_t* installerPath, const wchar_t* upgradeSubkey,
+                        REGSAM access, const wchar_t* operation, Remove remove) {
     UniqueHKey installer;
-    if (OpenKey(root, installerPath, KEY_ALL_ACCESS, installer) != ERROR_SUCCESS) {
-        if (logged) {
+    if (OpenKey(root, installerPath, access, installer) != ERROR_SUCCESS) {
+        if (operation != nullptr) {
             TraceLevel4(TraceValue(
                 "DelInstallerKeyByUpgrade: RegOpenKeyEx CURRENT_USER_INSTALLER_KEY FAILED!\n"));
         }
@@ -78,20 +81,26 @@ void DelRegistrationByUpgrade(HKEY root, const wchar_t* installerPath, const wch
     CStringEx upgradePath(installerPath);
     upgradePath += upgradeSubkey;
     UniqueHKey upgrade;
-    LONG opened = OpenKey(root, upgradePath.c_str(), KEY_ALL_ACCESS, upgrade);
-    if (opened != ERROR_SUCCESS) {
-        if (logged) {
-            LogUpgradeIdFailed(L"DelInstallerKeyByUpgrade", opened);
-        }
-    } else {
-        ForEachProductCode(upgrade.get(), [&](const wchar_t* code) {
-            DelProductAndFeatures(installer.get(), code);
-            DelUninstallEntry(root, code);
-        });
+    LONG opened = OpenKey(root, upgradePath.c_str(), access, upgrade);
+    if (opened == ERROR_SUCCESS) {
+        ForEachProductCode(upgrade.get(),
+                           [&](const wchar_t* code) { remove(installer.get(), code); });
         upgrade.reset();
+    } else if (operation != nullptr) {
+        LogUpgradeIdFailed(operation, opened);
     }
-    // Fails harmlessly while the key still has subkeys.
     RegDeleteKeyW(installer.get(), upgradeSubkey);
+}
+
+// The console user's (logged) or the machine's (silent) registration.
+void DelRegistrationByUpgrade(HKEY root, const wchar_t* installerPath, const wchar_t* upgradeSubkey,
+                              bool logged) {
+    RemoveRegistration(root, installerPath, upgradeSubkey, KEY_ALL_ACCESS,
+                       logged ? L"DelInstallerKeyByUpgrade" : nullptr,
+                       [root](HKEY installer, const wchar_t* code) {
+                           DelProductAndFeatures(installer, code);
+                           DelUninstallEntry(root, code);
+                       });
 }
 
 }  // namespace
@@ -135,33 +144,18 @@ void DelInstallerKeyByUpgrade(const wchar_t* upgradeSubkey) {
 }
 
 void DelInstallerKeyOnCurrentUserForSMS(const wchar_t* upgradeSubkey) {
-    UniqueHKey installer;
-    if (OpenKey(HKEY_CURRENT_USER, kUserInstallerKey, KEY_READ, installer) != ERROR_SUCCESS) {
-        TraceLevel4(TraceValue(
-            "DelInstallerKeyByUpgrade: RegOpenKeyEx CURRENT_USER_INSTALLER_KEY FAILED!\n"));
-        return;
-    }
-    CStringEx upgradePath(kUserInstallerKey);
-    upgradePath += upgradeSubkey;
-    UniqueHKey upgrade;
-    LONG opened = OpenKey(HKEY_CURRENT_USER, upgradePath.c_str(), KEY_READ, upgrade);
-    if (opened != ERROR_SUCCESS) {
-        LogUpgradeIdFailed(L"DelInstallerKeyOnCurrentUserForSMS", opened);
-    } else {
-        ForEachProductCode(upgrade.get(), [](const wchar_t* code) {
-            for (const wchar_t* list : {L"Products", L"Features"}) {
-                CStringEx path(kUserInstallerKey);
-                CStringEx::PathAppend(path, list);
-                CStringEx::PathAppend(path, code);
-                CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, path.c_str(), 0);
-            }
-            CStringEx entry(kUninstallKey);
-            CStringEx::PathAppend(entry, BracedCode(code).c_str());
-            CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, entry.c_str(), 0);
-        });
-        upgrade.reset();
-    }
-    RegDeleteKeyW(installer.get(), upgradeSubkey);
+    RemoveRegistration(HKEY_CURRENT_USER, kUserInstallerKey, upgradeSubkey, KEY_READ,
+                       L"DelInstallerKeyOnCurrentUserForSMS", [](HKEY, const wchar_t* code) {
+                           for (const wchar_t* list : {L"Products", L"Features"}) {
+                               CStringEx path(kUserInstallerKey);
+                               CStringEx::PathAppend(path, list);
+                               CStringEx::PathAppend(path, code);
+                               CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, path.c_str(), 0);
+                           }
+                           CStringEx entry(kUninstallKey);
+                           CStringEx::PathAppend(entry, BracedCode(code).c_str());
+                           CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, entry.c_str(), 0);
+                       });
 }
 
 void ModifyAdminMsiDisplayVersion() {
