@@ -32,29 +32,32 @@ private:
 
 }  // namespace
 
-void CRptStream::Clear() {
-    m_data.reset();
-    m_size = 0;
-}
-
 BOOL CRptStream::ReadExpected(HANDLE file, DWORD expected, DWORD extra) {
     Clear();
     if (expected > 0xFFFFFFFF - extra) {
         return FALSE;
     }
-    std::unique_ptr<BYTE[]> data(new (std::nothrow) BYTE[expected + extra]());
-    if (!data) {
-        return FALSE;
+    if (expected + extra > m_capacity) {
+        m_data.reset();
+        m_capacity = 0;
+        m_data.reset(new (std::nothrow) BYTE[expected + extra]);
+        if (!m_data) {
+            return FALSE;
+        }
+        m_capacity = expected + extra;
     }
+    BYTE* data = m_data.get();
     DWORD total = 0;
     while (total < expected) {
         DWORD got = 0;
-        if (!::ReadFile(file, data.get() + total, expected - total, &got, nullptr) || got == 0) {
+        if (!::ReadFile(file, data + total, expected - total, &got, nullptr) || got == 0) {
             return FALSE;  // failed, or the file ended early: it shrank
         }
         total += got;
     }
-    m_data = std::move(data);
+    for (DWORD i = 0; i < extra; ++i) {
+        data[expected + i] = 0;
+    }
     m_size = expected;
     return TRUE;
 }

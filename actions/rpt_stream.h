@@ -21,10 +21,12 @@ public:
     // when addTerminator is set); else 0 with an empty buffer.
     BOOL ReadFromFile(const wchar_t* path, BOOL addTerminator);
 
-    const BYTE* Data() const { return m_data.get(); }
-    // The file's bytes, without the terminator.
+    // The file's bytes, null while there are none.
+    const BYTE* Data() const { return m_size > 0 ? m_data.get() : nullptr; }
+    // The number of the file's bytes, without the terminator.
     DWORD Size() const { return m_size; }
-    void Clear();
+    // Empties the buffer; its memory is kept for the next file.
+    void Clear() { m_size = 0; }
 
     // Reads exactly `expected` bytes (the size just measured) from the start
     // of file, with `extra` zero bytes reserved behind them. A file that
@@ -34,5 +36,6 @@ public:
 
 private:
     std::unique_ptr<BYTE[]> m_data;
+    DWORD m_capacity = 0;
     DWORD m_size = 0;
 };

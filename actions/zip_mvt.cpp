@@ -10,6 +10,8 @@
 
 namespace {
 
+const DWORD kWritePiece = 16 * 1024;
+
 // Entry time: now, in UTC.
 zip_fileinfo EntryInfo() {
     SYSTEMTIME now = {};
@@ -77,6 +79,15 @@ void CZipMvt::CompressMvtFile(const wchar_t* path) {
         return;
     }
     TraceLevel2(TraceValue("compress -- read file sucess"));
-    zipWriteInFileInZip(m_zip, m_stream.Data(), m_stream.Size());
+    // In pieces, so the checksum and the compressor read each piece while it
+    // is still in the processor's cache.
+    const BYTE* data = m_stream.Data();
+    for (DWORD done = 0; done < m_stream.Size();) {
+        DWORD piece = m_stream.Size() - done < kWritePiece ? m_stream.Size() - done : kWritePiece;
+        if (zipWriteInFileInZip(m_zip, data + done, piece) != ZIP_OK) {
+            break;
+        }
+        done += piece;
+    }
     zipCloseFileInZip(m_zip);
 }
