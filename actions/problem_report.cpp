@@ -142,7 +142,8 @@ void CSendProblemReport::SendReport() {
     wchar_t traceFolder[MAX_PATH] = {};
     FindTraceFolder(traceFolder, MAX_PATH);
     CStringEx folder = FolderWithoutSeparator(traceFolder);
-    if (!GatherTraceFiles(folder, report)) {
+    // No folder at all must not turn into a search of the drive's root.
+    if (folder.IsEmpty() || !GatherTraceFiles(folder, report)) {
         TraceLevel2(TraceValue("IsTmpFileExist  the  file is not found! \n"));
         return;
     }
