@@ -5,7 +5,6 @@
 // Prints both throughputs per round and the ratio ours / minizip (goal: at
 // least 0.9).
 #include <windows.h>
-#include <shlwapi.h>
 
 #include <cstdio>
 #include <string>
@@ -19,14 +18,6 @@ namespace {
 const int kFiles = 20;
 const DWORD kFileSize = 2 * 1024 * 1024;
 const int kRounds = 11;
-
-std::wstring BinDir() {
-    wchar_t path[MAX_PATH] = {};
-    GetModuleFileNameW(nullptr, path, MAX_PATH);
-    PathRemoveFileSpecW(path);  // bin/bench
-    PathRemoveFileSpecW(path);  // bin
-    return path;
-}
 
 // Trace-like text: records with varying numbers, as the trace library writes.
 std::string TraceText(int seed) {
@@ -46,17 +37,6 @@ std::string TraceText(int seed) {
     return text;
 }
 
-bool WriteAll(const std::wstring& path, const std::string& bytes) {
-    HANDLE file = CreateFileW(path.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_ALWAYS, 0, nullptr);
-    if (file == INVALID_HANDLE_VALUE) {
-        return false;
-    }
-    DWORD written = 0;
-    BOOL ok = WriteFile(file, bytes.data(), static_cast<DWORD>(bytes.size()), &written, nullptr);
-    CloseHandle(file);
-    return ok && written == bytes.size();
-}
-
 DWORD SizeOf(const std::wstring& path) {
     WIN32_FILE_ATTRIBUTE_DATA data = {};
     return GetFileAttributesExW(path.c_str(), GetFileExInfoStandard, &data) ? data.nFileSizeLow : 0;
@@ -64,29 +44,9 @@ DWORD SizeOf(const std::wstring& path) {
 
 // Milliseconds from the start of commandLine to its exit, its output discarded.
 double QuietProcessMilliseconds(const std::wstring& commandLine) {
-    SECURITY_ATTRIBUTES inherit = {sizeof(inherit), nullptr, TRUE};
-    HANDLE nul =
-        CreateFileW(L"NUL", GENERIC_READ | GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE,
-                    &inherit, OPEN_EXISTING, 0, nullptr);
-    STARTUPINFOW startup = {};
-    startup.cb = sizeof(startup);
-    startup.dwFlags = STARTF_USESTDHANDLES;
-    startup.hStdInput = nul;
-    startup.hStdOutput = nul;
-    startup.hStdError = nul;
-    std::vector<wchar_t> line(commandLine.begin(), commandLine.end());
-    line.push_back(L'\0');
-    PROCESS_INFORMATION process = {};
     double start = NowMilliseconds();
-    if (CreateProcessW(nullptr, line.data(), nullptr, nullptr, TRUE, 0, nullptr, nullptr, &startup,
-                       &process)) {
-        WaitForSingleObject(process.hProcess, INFINITE);
-        CloseHandle(process.hThread);
-        CloseHandle(process.hProcess);
-    }
-    double elapsed = NowMilliseconds() - start;
-    CloseHandle(nul);
-    return elapsed;
+    RunQuietly(commandLine);
+    return NowMilliseconds() - start;
 }
 
 double MiBPerSecond(double milliseconds) {
@@ -96,7 +56,7 @@ double MiBPerSecond(double milliseconds) {
 }  // namespace
 
 int wmain() {
-    std::wstring bin = BinDir();
+    std::wstring bin = BuildBinDir();
     wchar_t temp[MAX_PATH] = {};
     GetTempPathW(MAX_PATH, temp);
     std::wstring folder = std::wstring(temp) + L"qm-zip-bench";
@@ -106,7 +66,7 @@ int wmain() {
     std::wstring toolFiles;
     for (int i = 0; i < kFiles; ++i) {
         std::wstring path = folder + L"\\trace" + std::to_wstring(i) + L".mvt";
-        if (!WriteAll(path, TraceText(i))) {
+        if (!WriteWholeFile(path, TraceText(i))) {
             printf("could not write %ls\n", path.c_str());
             return 1;
         }
