@@ -1,8 +1,8 @@
 #include "actions/log_posting.h"
 
-#include "actions/message_pump.h"
 #include "actions/url_object.h"
 #include "base/com_owners.h"
+#include "base/message_pump.h"
 #include "base/path_api.h"
 #include "base/proc_address.h"
 #include "base/trace.h"

@@ -6,9 +6,9 @@
 
 #include <string>
 
-#include "actions/message_pump.h"
 #include "actions/problem_report.h"
 #include "actions/rpt_stream.h"
+#include "base/message_pump.h"
 #include "tests/support/file_util.h"
 #include "tests/support/scratch_dir.h"
 #include "tests/support/trace_capture.h"
