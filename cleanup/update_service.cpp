@@ -3,6 +3,8 @@
 #include <stdarg.h>
 #include <stdio.h>
 
+#include <algorithm>
+
 #include "base/win_handles.h"
 
 namespace {
@@ -12,15 +14,18 @@ const DWORD kStopBudgetMs = 60000;
 // Added to each wait hint for the time a poll itself takes.
 const DWORD kPollCostMs = 10;
 
-// Asks a running service to stop and waits while it says it is stopping, at
-// most about a minute in all.
+// Asks a running service to stop and waits while it says it is stopping:
+// each wait hint plus the poll's cost counts against a minute in all. No
+// single wait outlasts what is left of that minute, whatever hint (up to
+// INFINITE) the service gives.
 void StopAndWait(SC_HANDLE service) {
     SERVICE_STATUS status = {};
     BOOL answered = ControlService(service, SERVICE_CONTROL_STOP, &status);
-    DWORD waited = 0;
+    ULONGLONG waited = 0;
     while (answered) {
-        Sleep(status.dwWaitHint);
-        waited += status.dwWaitHint + kPollCostMs;
+        const ULONGLONG left = kStopBudgetMs - waited + 1;
+        Sleep(static_cast<DWORD>(std::min<ULONGLONG>(status.dwWaitHint, left)));
+        waited += static_cast<ULONGLONG>(status.dwWaitHint) + kPollCostMs;
         answered = QueryServiceStatus(service, &status);
         if (status.dwCurrentState == SERVICE_STOPPED || waited > kStopBudgetMs) {
             break;
