@@ -1,13 +1,17 @@
 // Runs qmMrvONI.exe for the demo and prints what it did: the command line,
 // each trace record it wrote (level and text) and its exit code.
 //   demo_runner.exe <program folder> <arguments>...
-// Each further argument is one command line after the program name.
+// Each further argument is one command line after the program name. When
+// QM_DEMO_AWAIT names executables (separated by ";"), the programs the run
+// started under those names are waited for, so their records show too.
 #include <windows.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <string>
 
 #include "tests/support/file_util.h"
+#include "tests/support/process_wait.h"
 #include "tests/support/program_run.h"
 
 namespace {
@@ -24,6 +28,18 @@ void PrintRecordText(const std::string& text) {
         }
     }
     printf("%s", shown.c_str());
+}
+
+void AwaitStartedPrograms() {
+    wchar_t names[1024] = {};
+    if (GetEnvironmentVariableW(L"QM_DEMO_AWAIT", names, 1024) >= 1024) {
+        return;
+    }
+    std::wstring list = names;
+    for (size_t start = 0, end; start < list.size(); start = end + 1) {
+        end = std::min(list.find(L';', start), list.size());
+        AwaitProcessesNamed(list.substr(start, end - start).c_str(), 120000);
+    }
 }
 
 }  // namespace
@@ -44,6 +60,7 @@ int wmain(int argc, wchar_t** argv) {
         RunAsDebuggee(L"\"" + program + L"\" " + arguments,
                       BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", traceLog}}), folder, 120000,
                       &run);
+        AwaitStartedPrograms();
         for (const TraceRecord& record : ParseTraceLog(ReadFileBytes(traceLog))) {
             printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
             PrintRecordText(record.text);

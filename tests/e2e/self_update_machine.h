@@ -4,7 +4,6 @@
 #pragma once
 
 #include <windows.h>
-#include <tlhelp32.h>
 #include <gtest/gtest.h>
 
 #include <sstream>
@@ -13,6 +12,7 @@
 
 #include "tests/support/file_util.h"
 #include "tests/support/machine_fixture.h"
+#include "tests/support/process_wait.h"
 #include "tests/support/registry_util.h"
 #include "tests/support/test_paths.h"
 
@@ -21,26 +21,6 @@ namespace self_update_test {
 const wchar_t kNotes8Key[] = L"SOFTWARE\\Lotus\\Notes\\8.0";
 const wchar_t kNIKey[] = L"SOFTWARE\\mirovan\\NI";
 const wchar_t kSiteKey[] = L"Software\\Mirovan_Notes\\General";
-
-// Waits for every process of this prefix that runs `name` to end: the update
-// starts its last program just before the process that started it ends.
-inline void AwaitProcesses(const wchar_t* name) {
-    HANDLE snapshot = CreateToolhelp32Snapshot(TH32CS_SNAPPROCESS, 0);
-    ASSERT_NE(INVALID_HANDLE_VALUE, snapshot);
-    PROCESSENTRY32W entry = {};
-    entry.dwSize = sizeof(entry);
-    for (BOOL more = Process32FirstW(snapshot, &entry); more;
-         more = Process32NextW(snapshot, &entry)) {
-        if (lstrcmpiW(entry.szExeFile, name) != 0) {
-            continue;
-        }
-        if (HANDLE process = OpenProcess(SYNCHRONIZE, FALSE, entry.th32ProcessID)) {
-            EXPECT_EQ(WAIT_OBJECT_0, WaitForSingleObject(process, 60000)) << Narrow(name);
-            CloseHandle(process);
-        }
-    }
-    CloseHandle(snapshot);
-}
 
 inline std::vector<std::string> Lines(const std::string& text) {
     std::vector<std::string> lines;
@@ -99,7 +79,7 @@ protected:
     // program it starts last.
     RunResult RunTemporaryCopy(DWORD timeoutMs = 20000) {
         RunResult run = TemporaryCopy().Run(L"-nupdate", timeoutMs);
-        AwaitProcesses(L"qmMrvONI.exe");
+        EXPECT_TRUE(AwaitProcessesNamed(L"qmMrvONI.exe", 60000));
         return run;
     }
 

@@ -14,7 +14,7 @@ TEST_F(SelfUpdateSlowE2E, UpdaterThatNeverEndsIsTerminatedAfterThirtySeconds) {
     DWORD start = GetTickCount();
     RunResult run = RunTemporaryCopy(90000);
     DWORD elapsed = GetTickCount() - start;
-    AwaitProcesses(L"~TmpDown.exe");
+    EXPECT_TRUE(AwaitProcessesNamed(L"~TmpDown.exe", 5000));
     std::vector<std::string> calls = Calls(TemporaryCopy());
 
     EXPECT_FALSE(run.timedOut || run.crashed);

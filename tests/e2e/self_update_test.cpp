@@ -180,8 +180,8 @@ TEST_F(SelfUpdateE2E, CommittedUpdateEndsWithTheCopiesGoneAndNotesCompleted) {
     ASSERT_TRUE(WriteFileBytes(JoinPath(m_notes, L"qmnires.dll"), "notes' own"));
     Script(installed, L"post-wait", 0);
     RunResult run = installed.Run(L"-nupdate", 20000);
-    AwaitProcesses(L"~MrvONI.exe");
-    AwaitProcesses(L"qmMrvONI.exe");
+    EXPECT_TRUE(AwaitProcessesNamed(L"~MrvONI.exe", 60000));
+    EXPECT_TRUE(AwaitProcessesNamed(L"qmMrvONI.exe", 60000));
     std::vector<std::string> calls = Calls(installed);
 
     EXPECT_FALSE(run.timedOut || run.crashed);
