@@ -19,8 +19,9 @@ bool StartUpdateProcess(const wchar_t* exePath, const wchar_t* parameters,
     info.lpDirectory = workingFolder;
     info.nShow = showCommand;
     if (!ShellExecuteExW(&info)) {
+        DWORD error = GetLastError();
         TraceLevel4(TraceValue("StartUpdateProcess: ShellExecuteExW failed"),
-                    TraceNamed("lpFile", exePath), TraceNamed("dwError", GetLastError()));
+                    TraceNamed("lpFile", exePath), TraceNamed("dwError", error));
         return false;
     }
     process->reset(info.hProcess);

@@ -49,10 +49,13 @@ protected:
     }
 };
 
+// No configuration tool in the plug-in folder.
+const int kNoConfigTool = -1;
+
 struct ProtocolCase {
     const char* what;
     const wchar_t* updater;  // the stand-in's script
-    int configExit;
+    int configExit;          // or kNoConfigTool
     int configDelayMs;
     const wchar_t* siteName;  // null: no "sitename" value
     int exitCode;
@@ -68,6 +71,8 @@ const ProtocolCase kProtocol[] = {
      " Config process exit with success, send out WM_DOWN_COMMIT to qmniupd.exe.,\n"},
     {"rollback", L"post-wait", 1, 0, nullptr, -1, 1, "rollback", "-nendupdatefail", 8,
      " qmniupd.exe exit with error, send out WM_DOWN_ROLLBACK to qmniupd.exe.,\n"},
+    {"configuration tool missing", L"post-wait", kNoConfigTool, 0, nullptr, -1, 0, "rollback",
+     "-nendupdatefail", 8, " Launching config process failed.,\n"},
     {"updater gone before the tool ends, naming no window", L"post-exit bogus", 0, 300, nullptr, 0,
      1, nullptr, "-nendupdate", 1, " Set g_bUpdateSuccess\n,\n"},
     {"download reported twice", L"post-wait twice", 0, 0, nullptr, 0, 1, "commit", "-nendupdate", 1,
@@ -88,6 +93,10 @@ TEST_F(SelfUpdateE2E, TemporaryCopyCommitsOrRollsBackAndHandsOverToTheInstalledP
             ASSERT_TRUE(RegPutString(HKEY_CURRENT_USER, kSiteKey, L"sitename", c.siteName));
         }
         Script(TemporaryCopy(), c.updater, c.configExit, c.configDelayMs);
+        DeleteFileW(JoinPath(m_plugin, L"qmnwcfg.exe").c_str());
+        if (c.configExit != kNoConfigTool) {
+            PutFake(L"qmnwcfg.exe", m_plugin, L"qmnwcfg.exe");
+        }
         RunResult run = RunTemporaryCopy();
         std::vector<std::string> calls = Calls(TemporaryCopy());
 
