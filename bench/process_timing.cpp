@@ -1,10 +1,10 @@
 #include "bench/process_timing.h"
 
+#include <shlwapi.h>
+
 #include <vector>
 
-namespace {
-
-void RunOnce(const std::wstring& commandLine) {
+void RunToExit(const std::wstring& commandLine) {
     std::vector<wchar_t> line(commandLine.begin(), commandLine.end());
     line.push_back(L'\0');
     STARTUPINFOW startup = {};
@@ -19,7 +19,13 @@ void RunOnce(const std::wstring& commandLine) {
     CloseHandle(process.hProcess);
 }
 
-}  // namespace
+std::wstring BenchBinDir() {
+    wchar_t path[MAX_PATH] = {};
+    GetModuleFileNameW(nullptr, path, MAX_PATH);
+    PathRemoveFileSpecW(path);  // bin/bench
+    PathRemoveFileSpecW(path);  // bin
+    return path;
+}
 
 double NowMilliseconds() {
     LARGE_INTEGER frequency, now;
@@ -30,11 +36,11 @@ double NowMilliseconds() {
 
 double MeanProcessMilliseconds(const std::wstring& commandLine, int runs, int warmUp) {
     for (int i = 0; i < warmUp; ++i) {
-        RunOnce(commandLine);
+        RunToExit(commandLine);
     }
     double start = NowMilliseconds();
     for (int i = 0; i < runs; ++i) {
-        RunOnce(commandLine);
+        RunToExit(commandLine);
     }
     return (NowMilliseconds() - start) / runs;
 }

@@ -11,6 +11,12 @@
 // waited for, closed), after `warmUp` unmeasured runs.
 double MeanProcessMilliseconds(const std::wstring& commandLine, int runs, int warmUp = 3);
 
+// Runs commandLine and waits for it to end.
+void RunToExit(const std::wstring& commandLine);
+
+// build/bin, seen from a benchmark in build/bin/bench.
+std::wstring BenchBinDir();
+
 // Milliseconds since an arbitrary start, with sub-millisecond resolution.
 double NowMilliseconds();
 

@@ -20,14 +20,6 @@ namespace {
 const wchar_t kNotesKey[] = L"SOFTWARE\\Lotus\\Notes\\8.0";
 const wchar_t kNIKey[] = L"SOFTWARE\\mirovan\\NI";
 
-std::wstring BinDir() {
-    wchar_t path[MAX_PATH] = {};
-    GetModuleFileNameW(nullptr, path, MAX_PATH);
-    PathRemoveFileSpecW(path);  // bin/bench
-    PathRemoveFileSpecW(path);  // bin
-    return path;
-}
-
 void PutString(const wchar_t* key, const std::wstring& value) {
     RegSetKeyValueW(HKEY_LOCAL_MACHINE, key, L"Path", REG_SZ, value.c_str(),
                     static_cast<DWORD>((value.size() + 1) * sizeof(wchar_t)));
@@ -77,19 +69,6 @@ double TicksNow() {
     return static_cast<double>(now.QuadPart);
 }
 
-void RunToEnd(const std::wstring& commandLine) {
-    std::wstring line = commandLine;
-    STARTUPINFOW startup = {};
-    startup.cb = sizeof(startup);
-    PROCESS_INFORMATION process = {};
-    if (CreateProcessW(nullptr, &line[0], nullptr, nullptr, FALSE, 0, nullptr, nullptr, &startup,
-                       &process)) {
-        WaitForSingleObject(process.hProcess, INFINITE);
-        CloseHandle(process.hThread);
-        CloseHandle(process.hProcess);
-    }
-}
-
 }  // namespace
 
 int wmain(int argc, wchar_t** argv) {
@@ -97,7 +76,7 @@ int wmain(int argc, wchar_t** argv) {
     if (runs <= 0) {
         runs = 10;
     }
-    std::wstring bin = BinDir();
+    std::wstring bin = BenchBinDir();
     wchar_t temp[MAX_PATH] = {};
     GetTempPathW(MAX_PATH, temp);
     std::wstring root = std::wstring(temp) + L"qm-self-update-bench";
@@ -131,7 +110,7 @@ int wmain(int argc, wchar_t** argv) {
     const std::wstring copy = L"\"" + plugin + L"\\~MrvONI.exe\" -nupdate";
     for (int i = 0; i < runs + 1; ++i) {  // the first round warms up
         DeleteFileW(times.c_str());
-        RunToEnd(copy);
+        RunToExit(copy);
         double posted = Moment(times, "~TmpDown.exe posted");
         double final = AwaitMoment(times, "qmMrvONI.exe started");
 

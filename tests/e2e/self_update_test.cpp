@@ -4,22 +4,11 @@
 // removes the copies at the end.
 #include <gtest/gtest.h>
 
-#include <cstring>
-
+#include "notes/plugin_file_lists.h"
 #include "tests/e2e/self_update_machine.h"
 
 namespace self_update_test {
 namespace {
-
-// clang-format off
-const wchar_t* const kPluginFiles[] = {
-    L"lcppn30.dll", L"ndbmrvqm.dll", L"qmnires.dll", L"NIURL.dll", L"qmMRVURL.DLL",
-    L"qmnwintc.dll", L"qmnwinto.dll", L"qmwnictl.dll", L"mirovan.nsf", L"qmniscpt.xml",
-    L"qmniupd.exe", L"mirovanni.chm", L"qmniadpt.dll", L"qmnwcfg.exe", L"qmMrvONI.exe",
-    L"qmONIUI.dll", L"qmOI3Res.dll", L"ieqmcodec.dll", L"QCLDLL.dll", L"QCLDLL64.dll",
-    L"QCLProxy.dll", L"QCLProxy64.dll", L"com.mrv.realtime.meeting_1.0.1.jar",
-    L"qmmrvjni.dll", L"msvcp120.dll", L"msvcr120.dll", L"mrvtrace.dll", L"mrvtraceX64.dll"};
-// clang-format on
 
 class SelfUpdateE2E : public SelfUpdateMachine {
 protected:
