@@ -1,7 +1,5 @@
 #include "bench/process_timing.h"
 
-#include <shlwapi.h>
-
 #include <vector>
 
 void RunToExit(const std::wstring& commandLine) {
@@ -17,14 +15,6 @@ void RunToExit(const std::wstring& commandLine) {
     WaitForSingleObject(process.hProcess, INFINITE);
     CloseHandle(process.hThread);
     CloseHandle(process.hProcess);
-}
-
-std::wstring BenchBinDir() {
-    wchar_t path[MAX_PATH] = {};
-    GetModuleFileNameW(nullptr, path, MAX_PATH);
-    PathRemoveFileSpecW(path);  // bin/bench
-    PathRemoveFileSpecW(path);  // bin
-    return path;
 }
 
 double NowMilliseconds() {

@@ -14,9 +14,6 @@ double MeanProcessMilliseconds(const std::wstring& commandLine, int runs, int wa
 // Runs commandLine and waits for it to end.
 void RunToExit(const std::wstring& commandLine);
 
-// build/bin, seen from a benchmark in build/bin/bench.
-std::wstring BenchBinDir();
-
 // Milliseconds since an arbitrary start, with sub-millisecond resolution.
 double NowMilliseconds();
 

@@ -4,69 +4,51 @@
 // floor of that road measured in the same run: starting the configuration
 // tool, waiting for it and starting the final command, one after the other.
 // The waits of the protocol are meant to be event-driven: the road may add at
-// most 100 ms to that floor.
+// most 100 ms to that floor. Usage: self_update_bench [runs]
 #include <windows.h>
-#include <shlwapi.h>
 
 #include <cstdio>
-#include <sstream>
 #include <string>
 
 #include "bench/process_timing.h"
 #include "notes/update_process_start.h"
+#include "tests/fakes/common/call_stamps.h"
+#include "tests/support/file_util.h"
+#include "tests/support/process_wait.h"
+#include "tests/support/program_run.h"
+#include "tests/support/registry_util.h"
+#include "tests/support/scratch_dir.h"
+#include "tests/support/test_paths.h"
 
 namespace {
 
-const wchar_t kNotesKey[] = L"SOFTWARE\\Lotus\\Notes\\8.0";
-const wchar_t kNIKey[] = L"SOFTWARE\\mirovan\\NI";
+const char kFinalStart[] = "qmMrvONI.exe started";
 
-void PutString(const wchar_t* key, const std::wstring& value) {
-    RegSetKeyValueW(HKEY_LOCAL_MACHINE, key, L"Path", REG_SZ, value.c_str(),
-                    static_cast<DWORD>((value.size() + 1) * sizeof(wchar_t)));
+// Milliseconds from the updater's report to the final command's start.
+double Road(const std::wstring& copy, const std::wstring& calls) {
+    DeleteFileW(calls.c_str());
+    RunToExit(L"\"" + copy + L"\" -nupdate");
+    AwaitProcessesNamed(L"qmMrvONI.exe", 60000);
+    std::string log = ReadFileBytes(calls);
+    double posted = fake::CallStamp(log, "~TmpDown.exe posted");
+    double final = fake::CallStamp(log, kFinalStart);
+    return posted < 0 || final < 0 ? -1 : final - posted;
 }
 
-// The counter ticks a stand-in recorded for `what` ("<file> <event>"), or -1.
-double Moment(const std::wstring& log, const std::string& what) {
-    HANDLE file = CreateFileW(log.c_str(), GENERIC_READ, FILE_SHARE_READ | FILE_SHARE_WRITE,
-                              nullptr, OPEN_EXISTING, 0, nullptr);
-    if (file == INVALID_HANDLE_VALUE) {
-        return -1;
+// Milliseconds to start the tool, wait for it and start the final command.
+double Floor(const std::wstring& tool, const std::wstring& final, const std::wstring& notes,
+             const std::wstring& calls) {
+    DeleteFileW(calls.c_str());
+    double start = NowMilliseconds();
+    UniqueHandle process;
+    if (StartUpdateProcess(tool.c_str(), L"-update", notes.c_str(), SW_SHOW, &process)) {
+        WaitForSingleObject(process.get(), INFINITE);
     }
-    char buffer[4096];
-    DWORD got = 0;
-    ReadFile(file, buffer, sizeof(buffer), &got, nullptr);
-    CloseHandle(file);
-    std::istringstream lines(std::string(buffer, got));
-    for (std::string line; std::getline(lines, line);) {
-        if (line.compare(0, what.size(), what) == 0) {
-            return std::stod(line.substr(what.size() + 1));
-        }
+    if (StartUpdateProcess(final.c_str(), L"-nendupdate", nullptr, SW_HIDE, &process)) {
+        WaitForSingleObject(process.get(), INFINITE);
     }
-    return -1;
-}
-
-// Waits until the stand-in has recorded `what`; its ticks, or -1 after 10 s.
-double AwaitMoment(const std::wstring& log, const std::string& what) {
-    for (int i = 0; i < 1000; ++i) {
-        double ticks = Moment(log, what);
-        if (ticks >= 0) {
-            return ticks;
-        }
-        Sleep(10);
-    }
-    return -1;
-}
-
-double TicksToMs(double ticks) {
-    LARGE_INTEGER frequency;
-    QueryPerformanceFrequency(&frequency);
-    return ticks * 1000.0 / static_cast<double>(frequency.QuadPart);
-}
-
-double TicksNow() {
-    LARGE_INTEGER now;
-    QueryPerformanceCounter(&now);
-    return static_cast<double>(now.QuadPart);
+    double started = fake::CallStamp(ReadFileBytes(calls), kFinalStart);
+    return started < 0 ? -1 : started - start;
 }
 
 }  // namespace
@@ -76,87 +58,52 @@ int wmain(int argc, wchar_t** argv) {
     if (runs <= 0) {
         runs = 10;
     }
-    std::wstring bin = BenchBinDir();
-    wchar_t temp[MAX_PATH] = {};
-    GetTempPathW(MAX_PATH, temp);
-    std::wstring root = std::wstring(temp) + L"qm-self-update-bench";
-    std::wstring notes = root + L"\\Lotus\\Notes";
-    std::wstring plugin = root + L"\\NI\\Notes";
-    std::wstring times = root + L"\\times.log";
-    for (const std::wstring& folder : {root, root + L"\\Lotus", notes, root + L"\\NI", plugin}) {
-        CreateDirectoryW(folder.c_str(), nullptr);
-    }
-    const std::wstring copies[][2] = {
-        {bin + L"\\qmMrvONI.exe", plugin + L"\\~MrvONI.exe"},
-        {bin + L"\\fakes\\mrvtrace.dll", plugin + L"\\mrvtrace.dll"},
-        {bin + L"\\fakes\\qmniupd.exe", plugin + L"\\~TmpDown.exe"},
-        {bin + L"\\fakes\\qmnwcfg.exe", plugin + L"\\qmnwcfg.exe"},
-        // Records the start of the final command.
-        {bin + L"\\fakes\\qmnwcfg.exe", notes + L"\\qmMrvONI.exe"},
-    };
-    for (const auto& copy : copies) {
-        CopyFileW(copy[0].c_str(), copy[1].c_str(), FALSE);
-    }
-    PutString(kNotesKey, notes);
-    PutString(kNIKey, plugin);
+    ScratchDir scratch(L"bench-selfupdate");
+    std::wstring notes = scratch.Sub(L"Lotus\\Notes", true);
+    std::wstring plugin = scratch.Sub(L"NI\\Notes", true);
+    std::wstring calls = scratch.Sub(L"calls.log");
+    ProgramOptions options;
+    options.exeName = L"~MrvONI.exe";
+    ProgramUnderTest copy(plugin, options);
+    std::wstring tool = JoinPath(plugin, L"qmnwcfg.exe");
+    std::wstring final = JoinPath(notes, L"qmMrvONI.exe");  // records its start
+    CopyFileW(FakePath(L"qmniupd.exe").c_str(), JoinPath(plugin, L"~TmpDown.exe").c_str(), FALSE);
+    CopyFileW(FakePath(L"qmnwcfg.exe").c_str(), tool.c_str(), FALSE);
+    CopyFileW(FakePath(L"qmnwcfg.exe").c_str(), final.c_str(), FALSE);
+    RegPutString(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Lotus\\Notes\\8.0", L"Path", notes);
+    RegPutString(HKEY_LOCAL_MACHINE, L"SOFTWARE\\mirovan\\NI", L"Path", plugin);
     SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);
-    SetEnvironmentVariableW(L"QM_FAKE_CALLS_LOG", nullptr);
+    SetEnvironmentVariableW(L"QM_FAKE_CALLS_LOG", calls.c_str());
+    SetEnvironmentVariableW(L"QM_FAKE_STAMP_CALLS", L"1");
     SetEnvironmentVariableW(L"QM_FAKE_UPDATER", L"post-wait");
     SetEnvironmentVariableW(L"QM_FAKE_CONFIG_EXIT", L"0");
-    SetEnvironmentVariableW(L"QM_FAKE_TIMES_LOG", times.c_str());
 
     Series road{"1125 to final command", {}};
     Series floor{"floor: start tool, wait, start final", {}};
-    const std::wstring copy = L"\"" + plugin + L"\\~MrvONI.exe\" -nupdate";
-    for (int i = 0; i < runs + 1; ++i) {  // the first round warms up
-        DeleteFileW(times.c_str());
-        RunToExit(copy);
-        double posted = Moment(times, "~TmpDown.exe posted");
-        double final = AwaitMoment(times, "qmMrvONI.exe started");
-
-        DeleteFileW(times.c_str());
-        double start = TicksNow();
-        UniqueHandle tool;
-        UniqueHandle last;
-        if (StartUpdateProcess((plugin + L"\\qmnwcfg.exe").c_str(), L"-update", notes.c_str(),
-                               SW_SHOW, &tool)) {
-            WaitForSingleObject(tool.get(), INFINITE);
+    Road(copy.exePath(), calls);  // warm-up
+    for (int i = 0; i < runs; ++i) {
+        double roadMs = Road(copy.exePath(), calls);
+        double floorMs = Floor(tool, final, notes, calls);
+        if (roadMs >= 0 && floorMs >= 0) {
+            road.ms.push_back(roadMs);
+            floor.ms.push_back(floorMs);
         }
-        StartUpdateProcess((notes + L"\\qmMrvONI.exe").c_str(), L"-nendupdate", nullptr, SW_HIDE,
-                           &last);
-        double floorEnd = AwaitMoment(times, "qmMrvONI.exe started");
-        if (last) {
-            WaitForSingleObject(last.get(), INFINITE);
-        }
-        if (i == 0 || posted < 0 || final < 0 || floorEnd < 0) {
-            continue;
-        }
-        road.ms.push_back(TicksToMs(final - posted));
-        floor.ms.push_back(TicksToMs(floorEnd - start));
     }
-
-    if (road.ms.empty() || floor.ms.empty()) {
+    RegRemoveTree(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Lotus");
+    RegRemoveTree(HKEY_LOCAL_MACHINE, L"SOFTWARE\\mirovan");
+    if (road.ms.empty()) {
         printf("self-update road: no complete run\n");
         return 1;
     }
+
     double roadMs = road.Median();
     double floorMs = floor.Median();
     printf("self-update road, median of %d runs (ms)\n", static_cast<int>(road.ms.size()));
-    printf("  %-40s %8.2f  (min %.2f, max %.2f)\n", road.name, roadMs, road.ms.front(),
-           road.ms.back());
-    printf("  %-40s %8.2f  (min %.2f, max %.2f)\n", floor.name, floorMs, floor.ms.front(),
-           floor.ms.back());
+    for (Series* series : {&road, &floor}) {
+        printf("  %-40s %8.2f  (min %.2f, max %.2f)\n", series->name, series->Median(),
+               series->ms.front(), series->ms.back());
+    }
     printf("added by the protocol: %.2f ms (goal: at most 100) %s\n", roadMs - floorMs,
            roadMs - floorMs <= 100.0 ? "MET" : "NOT MET");
-
-    RegDeleteTreeW(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Lotus");
-    RegDeleteTreeW(HKEY_LOCAL_MACHINE, L"SOFTWARE\\mirovan");
-    for (const auto& copy : copies) {
-        DeleteFileW(copy[1].c_str());
-    }
-    DeleteFileW(times.c_str());
-    for (const std::wstring& folder : {plugin, root + L"\\NI", notes, root + L"\\Lotus", root}) {
-        RemoveDirectoryW(folder.c_str());
-    }
     return 0;
 }

@@ -27,7 +27,7 @@ export QM_DEMO_AWAIT='~MrvONI.exe;qmMrvONI.exe'
 # The records of the installed program, its temporary copy and the final run.
 run -nupdate
 unset QM_FAKE_CALLS_LOG QM_FAKE_UPDATER QM_FAKE_CONFIG_EXIT QM_DEMO_AWAIT
-echo "  the updater and the configuration tool (stand-ins) saw:"
+echo "  what the updater and the configuration tool (stand-ins) did:"
 grep -v qmusredt "$c/self-update-calls.log" | tr -d '\r' | sed 's/^/    /'
 rm -f "$c/self-update-calls.log"
 echo "  temporary copies left in the plug-in folder: $(cd "$plugin" && ls -- '~'* 2>/dev/null || echo none)"

@@ -1,15 +1,11 @@
 // Runs qmMrvONI.exe for the demo and prints what it did: the command line,
 // each trace record it wrote (level and text) and its exit code.
 //   demo_runner.exe <program folder> <arguments>...
-<<<<<<< HEAD
-// Each further argument is one command line after the program name. When
-// QM_DEMO_AWAIT names executables (separated by ";"), the programs the run
-// started under those names are waited for, so their records show too.
-=======
 // Each further argument is one command line after the program name; "{caller}"
 // in it stands for the handle of a window of the runner's that prints the
 // WM_COPYDATA messages it receives, as a calling suite program would get them.
->>>>>>> main
+// When QM_DEMO_AWAIT names executables (separated by ";"), the programs the
+// run started under those names are waited for, so their records show too.
 #include <windows.h>
 
 #include <algorithm>

@@ -1,6 +1,5 @@
 // Shared by the stand-in programs: what they were started with, recorded in
-// the calls log as "<file name> started: <arguments> | <working folder>", and
-// moments on the performance counter for the benchmarks.
+// the calls log as "<file name> started: <arguments> | <working folder>".
 #pragma once
 
 #include <windows.h>
@@ -63,14 +62,6 @@ inline void RecordStart() {
     wchar_t folder[MAX_PATH] = {};
     GetCurrentDirectoryW(MAX_PATH, folder);
     RecordEvent("started: " + Narrow(Arguments()) + " | " + Narrow(folder));
-}
-
-// "<file name> <what> <counter ticks>" in the file named by QM_FAKE_TIMES_LOG.
-inline void RecordMoment(const std::string& what) {
-    LARGE_INTEGER now;
-    QueryPerformanceCounter(&now);
-    AppendToFileNamedBy(L"QM_FAKE_TIMES_LOG",
-                        OwnFileName() + " " + what + " " + std::to_string(now.QuadPart) + "\n");
 }
 
 }  // namespace fake

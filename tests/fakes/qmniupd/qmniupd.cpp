@@ -73,7 +73,7 @@ int WINAPI wWinMain(HINSTANCE instance, HINSTANCE, PWSTR, int) {
     }
     WPARAM reported =
         Has(script, L"bogus") ? static_cast<WPARAM>(0x7FFF0000) : reinterpret_cast<WPARAM>(window);
-    fake::RecordMoment("posted");
+    fake::RecordEvent("posted: " + std::to_string(message));
     for (int i = Has(script, L"twice") ? 2 : 1; i > 0; --i) {
         PostMessageW(ParentWindow(), message, reported, 0);
     }

@@ -9,7 +9,6 @@
 #include "tests/fakes/common/fake_program.h"
 
 int WINAPI wWinMain(HINSTANCE, HINSTANCE, PWSTR, int) {
-    fake::RecordMoment("started");
     fake::RecordStart();
     Sleep(static_cast<DWORD>(_wtoi(fake::EnvironmentValue(L"QM_FAKE_CONFIG_DELAY_MS").c_str())));
     return _wtoi(fake::EnvironmentValue(L"QM_FAKE_CONFIG_EXIT").c_str());
