@@ -27,7 +27,7 @@ const char kFinalStart[] = "qmMrvONI.exe started";
 // Milliseconds from the updater's report to the final command's start.
 double Road(const std::wstring& copy, const std::wstring& calls) {
     DeleteFileW(calls.c_str());
-    RunToExit(L"\"" + copy + L"\" -nupdate");
+    RunQuietly(L"\"" + copy + L"\" -nupdate");
     AwaitProcessesNamed(L"qmMrvONI.exe", 60000);
     std::string log = ReadFileBytes(calls);
     double posted = fake::CallStamp(log, "~TmpDown.exe posted");

@@ -1,47 +1,91 @@
 // The Notes plug-in's self-update run by the real program: the installed
 // program hands over to its temporary copy, the copy's hidden window speaks
 // with the stand-in updater and configuration tool, and the installed program
-// removes the copies at the end.
+// removes the copies at the end. SelfUpdateSlow runs as a test of its own.
 #include <gtest/gtest.h>
 
-#include "notes/plugin_file_lists.h"
-#include "tests/e2e/self_update_machine.h"
+#include <algorithm>
+#include <cstring>
+#include <sstream>
 
-namespace self_update_test {
+#include "notes/plugin_file_lists.h"
+#include "tests/support/file_util.h"
+#include "tests/support/machine_fixture.h"
+#include "tests/support/process_wait.h"
+#include "tests/support/test_paths.h"
+
 namespace {
 
-class SelfUpdateE2E : public SelfUpdateMachine {
+const wchar_t kNotes8Key[] = L"SOFTWARE\\Lotus\\Notes\\8.0";
+const wchar_t kNIKey[] = L"SOFTWARE\\mirovan\\NI";
+const wchar_t kSiteKey[] = L"Software\\Mirovan_Notes\\General";
+
+// How many of the lines start with `start`.
+int Count(const std::string& lines, const std::string& start) {
+    std::istringstream stream(lines);
+    int count = 0;
+    for (std::string line; std::getline(stream, line);) {
+        count += line.compare(0, start.size(), start) == 0 ? 1 : 0;
+    }
+    return count;
+}
+
+bool HasRecord(const RunResult& run, DWORD level, const std::string& text) {
+    return std::any_of(run.traces.begin(), run.traces.end(), [&](const TraceRecord& record) {
+        return record.level == level && record.text == text;
+    });
+}
+
+class SelfUpdate : public MachineTest {
 protected:
-    // The updater's start as recorded: arguments after the window handle,
-    // and the working folder; empty when it was not started.
-    std::string UpdaterStartAfterHandle(const std::vector<std::string>& calls) {
-        const std::string start = "~TmpDown.exe started: -downstart -hParentWnd=";
-        for (const std::string& line : calls) {
-            if (line.compare(0, start.size(), start) == 0) {
-                size_t digits = line.find_first_not_of("0123456789", start.size());
-                EXPECT_GT(digits, start.size()) << line;
-                return line.substr(digits);
-            }
-        }
-        return std::string();
+    SelfUpdate()
+        : m_notes(m_scratch.Sub(L"Lotus\\Notes", true)),
+          m_plugin(m_scratch.Sub(L"NI\\Notes", true)) {
+        RegPutString(HKEY_LOCAL_MACHINE, kNotes8Key, L"Path", m_notes);
+        RegPutString(HKEY_LOCAL_MACHINE, kNIKey, L"Path", m_scratch.Sub(L"NI"));
+        Put(L"qmnwcfg.exe", m_plugin, L"qmnwcfg.exe");
     }
 
-    // The program's own folder, without the logs of its runs.
-    std::vector<std::wstring> ProgramFolderFiles() {
-        std::vector<std::wstring> files;
-        for (const std::wstring& name : ListDir(Program().folder())) {
-            if (name != L"trace.log" && name != L"calls.log") {
-                files.push_back(name);
-            }
-        }
-        return files;
+    static void Put(const wchar_t* fake, const std::wstring& folder, const wchar_t* name) {
+        ASSERT_TRUE(CopyFileW(FakePath(fake).c_str(), JoinPath(folder, name).c_str(), FALSE));
     }
+
+    static void Script(ProgramUnderTest& program, const wchar_t* updater, int configExit,
+                       int configDelayMs = 0) {
+        program.SetEnv(L"QM_FAKE_UPDATER", updater);
+        program.SetEnv(L"QM_FAKE_CONFIG_EXIT", std::to_wstring(configExit));
+        program.SetEnv(L"QM_FAKE_CONFIG_DELAY_MS", std::to_wstring(configDelayMs));
+    }
+
+    // The temporary copy (its name compared in any case) beside the stand-in
+    // updater; the installed program is a stand-in that records its start.
+    ProgramUnderTest& Copy() {
+        if (!m_copy) {
+            ProgramOptions options;
+            options.exeName = L"~MRVONI.EXE";
+            m_copy = std::make_unique<ProgramUnderTest>(m_plugin, options);
+            Put(L"qmniupd.exe", m_plugin, L"~TmpDown.exe");
+            Put(L"qmnwcfg.exe", m_notes, L"qmMrvONI.exe");
+        }
+        return *m_copy;
+    }
+
+    // Runs the copy and waits for the installed program it starts last.
+    RunResult RunCopy(DWORD timeoutMs = 20000) {
+        RunResult run = Copy().Run(L"-nupdate", timeoutMs);
+        EXPECT_TRUE(AwaitProcessesNamed(L"qmMrvONI.exe", 60000));
+        EXPECT_FALSE(run.timedOut || run.crashed);
+        return run;
+    }
+
+    std::wstring m_notes;
+    std::wstring m_plugin;
+    std::unique_ptr<ProgramUnderTest> m_copy;
 };
 
-// No configuration tool in the plug-in folder.
 const int kNoConfigTool = -1;
 
-struct ProtocolCase {
+const struct ProtocolCase {
     const char* what;
     const wchar_t* updater;  // the stand-in's script
     int configExit;          // or kNoConfigTool
@@ -49,13 +93,11 @@ struct ProtocolCase {
     const wchar_t* siteName;  // null: no "sitename" value
     int exitCode;
     int configRuns;
-    const char* updaterReceived;  // null: neither commit nor rollback
+    const char* updaterGot;  // null: neither commit nor rollback
     const char* finalCommand;
-    DWORD traceLevel;  // a record that shows the way taken (null: none)
-    const char* trace;
-};
-
-const ProtocolCase kProtocol[] = {
+    DWORD traceLevel;   // a record that shows the way taken
+    const char* trace;  // (null: none)
+} kProtocol[] = {
     {"commit", L"post-wait", 0, 0, L"acme site", 0, 1, "commit", "-nendupdate", 1,
      " Config process exit with success, send out WM_DOWN_COMMIT to qmniupd.exe.,\n"},
     {"rollback", L"post-wait", 1, 0, nullptr, -1, 1, "rollback", "-nendupdatefail", 8,
@@ -74,68 +116,60 @@ const ProtocolCase kProtocol[] = {
      "-nendupdatefail", 0, nullptr},
 };
 
-TEST_F(SelfUpdateE2E, TemporaryCopyCommitsOrRollsBackAndHandsOverToTheInstalledProgram) {
+TEST_F(SelfUpdate, TemporaryCopyCommitsOrRollsBackAndHandsOverToTheInstalledProgram) {
     for (const ProtocolCase& c : kProtocol) {
         SCOPED_TRACE(c.what);
         RegRemoveTree(HKEY_CURRENT_USER, kSiteKey);
         if (c.siteName != nullptr) {
-            ASSERT_TRUE(RegPutString(HKEY_CURRENT_USER, kSiteKey, L"sitename", c.siteName));
+            RegPutString(HKEY_CURRENT_USER, kSiteKey, L"sitename", c.siteName);
         }
-        Script(TemporaryCopy(), c.updater, c.configExit, c.configDelayMs);
+        Script(Copy(), c.updater, c.configExit, c.configDelayMs);
         DeleteFileW(JoinPath(m_plugin, L"qmnwcfg.exe").c_str());
         if (c.configExit != kNoConfigTool) {
-            PutFake(L"qmnwcfg.exe", m_plugin, L"qmnwcfg.exe");
+            Put(L"qmnwcfg.exe", m_plugin, L"qmnwcfg.exe");
         }
-        RunResult run = RunTemporaryCopy();
-        std::vector<std::string> calls = Calls(TemporaryCopy());
+        RunResult run = RunCopy();
+        std::string calls = ReadFileBytes(Copy().callsLogPath());
 
-        EXPECT_FALSE(run.timedOut || run.crashed);
         EXPECT_EQ(c.exitCode, run.exitCode);
-        std::string site = c.siteName ? Narrow(c.siteName) : "";
-        EXPECT_EQ(" -sitename=" + site + " | " + Narrow(m_notes), UpdaterStartAfterHandle(calls));
-        EXPECT_EQ(c.configRuns,
-                  CountStartingWith(calls, "qmnwcfg.exe started: -update | " + Narrow(m_notes)));
-        EXPECT_EQ(c.configRuns, CountStartingWith(calls, "qmnwcfg.exe started:"));
-        EXPECT_EQ(c.updaterReceived ? 1 : 0, CountStartingWith(calls, "~TmpDown.exe received:"));
-        if (c.updaterReceived != nullptr) {
-            EXPECT_EQ(1, CountStartingWith(
-                             calls, std::string("~TmpDown.exe received: ") + c.updaterReceived));
-        }
-        EXPECT_EQ(1, CountStartingWith(calls, "qmMrvONI.exe started:"));
-        EXPECT_EQ(1, CountStartingWith(
-                         calls, std::string("qmMrvONI.exe started: ") + c.finalCommand + " |"));
-        bool found = c.trace == nullptr;
-        for (const TraceRecord& record : run.traces) {
-            found = found || (record.level == c.traceLevel && record.text == c.trace);
-        }
-        EXPECT_TRUE(found) << run.TraceText();
+        // The updater's start: the window's handle, the site name, the Notes folder.
+        const std::string updater = "~TmpDown.exe started: -downstart -hParentWnd=";
+        size_t handle = calls.find(updater);
+        ASSERT_NE(std::string::npos, handle) << calls;
+        handle += updater.size();
+        std::string rest =
+            " -sitename=" + Narrow(c.siteName ? c.siteName : L"") + " | " + Narrow(m_notes);
+        EXPECT_EQ(handle + strspn(calls.c_str() + handle, "0123456789"), calls.find(rest + "\n"));
+        EXPECT_EQ(c.configRuns, Count(calls, "qmnwcfg.exe started: -update | " + Narrow(m_notes)));
+        EXPECT_EQ(c.updaterGot ? 1 : 0, Count(calls, std::string("~TmpDown.exe received: ") +
+                                                         (c.updaterGot ? c.updaterGot : "")));
+        EXPECT_EQ(1, Count(calls, std::string("qmMrvONI.exe started: ") + c.finalCommand + " |"));
+        EXPECT_TRUE(c.trace == nullptr || HasRecord(run, c.traceLevel, c.trace)) << run.TraceText();
     }
 }
 
-TEST_F(SelfUpdateE2E, UpdaterThatCannotStartEndsTheCopyAtOnceWithoutFinalCommand) {
+TEST_F(SelfUpdate, UpdaterThatCannotStartEndsTheCopyAtOnceWithoutFinalCommand) {
     for (bool notesKnown : {true, false}) {
         SCOPED_TRACE(notesKnown ? "no updater in the plug-in folder" : "no Notes folder");
-        Script(TemporaryCopy(), L"post-wait", 0);
+        Script(Copy(), L"post-wait", 0);
         DeleteFileW(JoinPath(m_plugin, L"~TmpDown.exe").c_str());
         if (!notesKnown) {
-            PutFake(L"qmniupd.exe", m_plugin, L"~TmpDown.exe");
+            Put(L"qmniupd.exe", m_plugin, L"~TmpDown.exe");
             RegRemoveTree(HKEY_LOCAL_MACHINE, kNotes8Key);
         }
-        RunResult run = RunTemporaryCopy();
+        RunResult run = RunCopy();
+        std::string calls = ReadFileBytes(Copy().callsLogPath());
 
-        EXPECT_FALSE(run.timedOut || run.crashed);
         EXPECT_EQ(0, run.exitCode);
-        EXPECT_EQ(1, run.CountTraces(" \nLaunching download process failed.\n,\n"));
-        std::vector<std::string> calls = Calls(TemporaryCopy());
-        EXPECT_EQ(0, CountStartingWith(calls, "~TmpDown.exe"));
-        EXPECT_EQ(0, CountStartingWith(calls, "qmMrvONI.exe"));
+        EXPECT_TRUE(HasRecord(run, 8, " \nLaunching download process failed.\n,\n"));
+        EXPECT_EQ(0, Count(calls, "~TmpDown.exe") + Count(calls, "qmMrvONI.exe"));
     }
 }
 
-TEST_F(SelfUpdateE2E, InstalledProgramThatCannotStartItsCopyFailsAtOnce) {
-    // A start that fails must neither be reported as success nor wait behind
-    // an error box that nobody closes, nor write in the current folder.
-    const std::wstring longFolder = m_plugin + L"\\" + std::wstring(300, L'n');
+TEST_F(SelfUpdate, InstalledProgramThatCannotStartItsCopyFailsAtOnce) {
+    // Neither success, nor a wait behind an error box nobody closes, nor a
+    // write in the current folder.
+    const std::wstring tooLong = m_plugin + L"\\" + std::wstring(300, L'n');
     const struct {
         const char* what;
         const wchar_t* program;      // the installed program in the Notes folder
@@ -143,57 +177,51 @@ TEST_F(SelfUpdateE2E, InstalledProgramThatCannotStartItsCopyFailsAtOnce) {
     } cases[] = {
         {"no installed program in the Notes folder", nullptr, &m_plugin},
         {"no plug-in folder registered", L"qmMrvONI.exe", nullptr},
-        {"plug-in folder longer than a path", L"qmMrvONI.exe", &longFolder},
+        {"plug-in folder longer than a path", L"qmMrvONI.exe", &tooLong},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         RegRemoveTree(HKEY_LOCAL_MACHINE, kNIKey);
         if (c.plugin != nullptr) {
-            ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, kNIKey, L"Path", *c.plugin));
+            RegPutString(HKEY_LOCAL_MACHINE, kNIKey, L"Path", *c.plugin);
         }
         DeleteFileW(JoinPath(m_notes, L"qmMrvONI.exe").c_str());
-        DeleteFileW(JoinPath(m_plugin, L"~TmpDown.exe").c_str());
-        PutFake(L"qmniupd.exe", m_notes, L"qmniupd.exe");
+        Put(L"qmniupd.exe", m_notes, L"qmniupd.exe");
         if (c.program != nullptr) {
-            PutFake(L"qmnwcfg.exe", m_notes, c.program);
+            Put(L"qmnwcfg.exe", m_notes, c.program);
         }
-        std::vector<std::wstring> before = ProgramFolderFiles();
+        Program().Run(L"-nosuchkeyword");  // leaves its logs, as the next run does
+        std::vector<std::wstring> before = ListDir(Program().folder());
         RunResult run = Program().Run(L"-nupdate", 20000);
 
         EXPECT_FALSE(run.timedOut || run.crashed);
         EXPECT_EQ(-1, run.exitCode);
-        EXPECT_EQ(1, run.CountTraces(" \nLaunching ~MrvONI.exe process failed.\n,\n"));
-        EXPECT_EQ(before, ProgramFolderFiles());
+        EXPECT_TRUE(HasRecord(run, 1, " \nLaunching ~MrvONI.exe process failed.\n,\n"));
+        EXPECT_EQ(before, ListDir(Program().folder()));
     }
 }
 
-TEST_F(SelfUpdateE2E, CommittedUpdateEndsWithTheCopiesGoneAndNotesCompleted) {
+TEST_F(SelfUpdate, CommittedUpdateEndsWithTheCopiesGoneAndNotesCompleted) {
     ProgramUnderTest installed(m_notes);
-    PutFake(L"qmniupd.exe", m_notes, L"qmniupd.exe");
+    Put(L"qmniupd.exe", m_notes, L"qmniupd.exe");
     for (const wchar_t* name : kPluginFiles) {
         if (!FileExists(JoinPath(m_plugin, name))) {
-            ASSERT_TRUE(WriteFileBytes(JoinPath(m_plugin, name), "new:" + Narrow(name)));
+            WriteFileBytes(JoinPath(m_plugin, name), "new:" + Narrow(name));
         }
     }
-    ASSERT_TRUE(WriteFileBytes(JoinPath(m_notes, L"qmnires.dll"), "notes' own"));
+    WriteFileBytes(JoinPath(m_notes, L"qmnires.dll"), "notes' own");
     Script(installed, L"post-wait", 0);
     RunResult run = installed.Run(L"-nupdate", 20000);
     EXPECT_TRUE(AwaitProcessesNamed(L"~MrvONI.exe", 60000));
     EXPECT_TRUE(AwaitProcessesNamed(L"qmMrvONI.exe", 60000));
-    std::vector<std::string> calls = Calls(installed);
+    std::string calls = ReadFileBytes(installed.callsLogPath());
 
-    EXPECT_FALSE(run.timedOut || run.crashed);
     EXPECT_EQ(0, run.exitCode);
-    EXPECT_EQ(1, CountStartingWith(calls, "~TmpDown.exe received: commit"));
-    EXPECT_EQ(1, CountStartingWith(calls, "qmnwcfg.exe started: -update | " + Narrow(m_notes)));
-    std::vector<TraceRecord> traces = ParseTraceLog(ReadFileBytes(installed.traceLogPath()));
-    int finalRuns = 0;
-    for (const TraceRecord& record : traces) {
-        finalRuns += record.text == "NIHandle lpCmdLine=-nendupdate,\n" ? 1 : 0;
-    }
-    EXPECT_EQ(1, finalRuns);
-    EXPECT_FALSE(FileExists(JoinPath(m_plugin, L"~TmpDown.exe")));
-    EXPECT_FALSE(FileExists(JoinPath(m_plugin, L"~MrvONI.exe")));
+    EXPECT_EQ(1, Count(calls, "~TmpDown.exe received: commit"));
+    EXPECT_EQ(1, Count(calls, "qmnwcfg.exe started: -update | " + Narrow(m_notes)));
+    // The final run removed the copies and completed the Notes folder.
+    EXPECT_FALSE(FileExists(JoinPath(m_plugin, L"~TmpDown.exe")) ||
+                 FileExists(JoinPath(m_plugin, L"~MrvONI.exe")));
     for (const wchar_t* name : kPluginFiles) {
         EXPECT_TRUE(FileExists(JoinPath(m_notes, name))) << Narrow(name);
     }
@@ -201,18 +229,21 @@ TEST_F(SelfUpdateE2E, CommittedUpdateEndsWithTheCopiesGoneAndNotesCompleted) {
     EXPECT_EQ("new:qmMRVURL.DLL", ReadFileBytes(JoinPath(m_notes, L"qmMRVURL.DLL")));
 }
 
-TEST_F(SelfUpdateE2E, FailedUpdateRemovesTheCopiesAndCompletesNothing) {
-    ProgramUnderTest installed(m_notes);
-    for (const wchar_t* name : {L"~TmpDown.exe", L"~MrvONI.exe", L"qmMRVURL.DLL"}) {
-        ASSERT_TRUE(WriteFileBytes(JoinPath(m_plugin, name), "x"));
-    }
-    RunResult run = installed.Run(L"-nendupdatefail");
+class SelfUpdateSlow : public SelfUpdate {};
 
+TEST_F(SelfUpdateSlow, UpdaterThatNeverEndsIsTerminatedAfterThirtySeconds) {
+    Script(Copy(), L"ignore", 0);
+    DWORD start = GetTickCount();
+    RunResult run = RunCopy(90000);
+    DWORD elapsed = GetTickCount() - start;
+    std::string calls = ReadFileBytes(Copy().callsLogPath());
+
+    EXPECT_TRUE(AwaitProcessesNamed(L"~TmpDown.exe", 5000));
     EXPECT_EQ(0, run.exitCode);
-    EXPECT_FALSE(FileExists(JoinPath(m_plugin, L"~TmpDown.exe")));
-    EXPECT_FALSE(FileExists(JoinPath(m_plugin, L"~MrvONI.exe")));
-    EXPECT_FALSE(FileExists(JoinPath(m_notes, L"qmMRVURL.DLL")));
+    EXPECT_GE(elapsed, 29000u);
+    EXPECT_LT(elapsed, 60000u);
+    EXPECT_EQ(1, Count(calls, "~TmpDown.exe received: commit"));
+    EXPECT_EQ(1, Count(calls, "qmMrvONI.exe started: -nendupdate |"));
 }
 
 }  // namespace
-}  // namespace self_update_test
