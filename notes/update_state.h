@@ -1,4 +1,4 @@
-// Process-wide state of the temporary update copy: its hidden window, the two
+// Process-wide state of the temporary update copy: its folders, the two
 // programs it runs and how the protocol with the updater has gone so far.
 // Created on first use, on the main thread only.
 #pragma once
@@ -8,7 +8,6 @@
 #include "base/win_handles.h"
 
 struct UpdateState {
-    HWND window = nullptr;
     // The running module's folder (the plug-in folder) and the Notes program
     // folder, both known once the hidden window exists.
     wchar_t moduleFolder[MAX_PATH] = {};

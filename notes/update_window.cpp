@@ -56,7 +56,6 @@ bool FindModuleFolder(wchar_t (&folder)[MAX_PATH]) {
 // WM_CREATE: starts the updater; -1 (no window) when it cannot be started.
 LRESULT StartUpdater(HWND window) {
     UpdateState& state = CurrentUpdateState();
-    state.window = window;
     wchar_t updater[MAX_PATH] = {};
     bool known = FindModuleFolder(state.moduleFolder) &&
                  JoinFilePath(state.moduleFolder, kTemporaryUpdaterFileName, updater);
