@@ -24,15 +24,13 @@ HRESULT CMSDom::CreateNode(IUnknown* pParent, BSTR bstrName, IUnknown** ppNew) {
         Message(L"CMSDom::CreateNode: Invalid argument\n");
         return E_INVALIDARG;
     }
-    ComPtr<IXMLDOMNode> parent = Query<IXMLDOMNode>(pParent, IID_IXMLDOMNode);
-    if (!parent) {
-        Message(L"CMSDom::CreateNode: Failed to get IXMLDOMNodePtr\n");
-        return E_POINTER;
-    }
+    ComPtr<IXMLDOMNode> parent;
     ComPtr<IXMLDOMDocument> doc;
-    if (!ms_dom::OwnerDocument(parent.Get(), &doc)) {
-        Message(L"CMSDom::CreateNode: Failed to get ownerDocument\n");
-        return E_POINTER;
+    HRESULT hr =
+        ms_dom::NodeInDocument(pParent, L"CMSDom::CreateNode: Failed to get IXMLDOMNodePtr\n",
+                               L"CMSDom::CreateNode: Failed to get ownerDocument\n", &parent, &doc);
+    if (FAILED(hr)) {
+        return hr;
     }
     // An element that cannot be made (no name) is not an error: nothing is added.
     ComPtr<IXMLDOMElement> element;

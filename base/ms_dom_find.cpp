@@ -117,15 +117,13 @@ HRESULT CMSDom::GetCommentsNode(IUnknown* pNode, BSTR bstrText, IUnknown** ppCom
         Message(L"CMSDom::GetCommentsNode: output ppINode is NULL!\n");
         return E_POINTER;
     }
-    ComPtr<IXMLDOMNode> node = Query<IXMLDOMNode>(pNode, IID_IXMLDOMNode);
-    if (!node) {
-        Message(L"CMSDom::GetCommentsNode: Failed to get IXMLDOMNodePtr\n");
-        return E_POINTER;
-    }
+    ComPtr<IXMLDOMNode> node;
     ComPtr<IXMLDOMDocument> doc;
-    if (!ms_dom::OwnerDocument(node.Get(), &doc)) {
-        Message(L"CMSDom::GetCommentsNode: Failed to get ownerDocument\n");
-        return E_POINTER;
+    HRESULT hr = ms_dom::NodeInDocument(
+        pNode, L"CMSDom::GetCommentsNode: Failed to get IXMLDOMNodePtr\n",
+        L"CMSDom::GetCommentsNode: Failed to get ownerDocument\n", &node, &doc);
+    if (FAILED(hr)) {
+        return hr;
     }
     ComPtr<IXMLDOMNodeList> children;
     if (doc->get_childNodes(children.GetAddressOf()) != S_OK || !children) {

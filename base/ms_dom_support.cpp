@@ -12,10 +12,21 @@ HRESULT HandOut(IUnknown* object, IUnknown** out) {
     return S_OK;
 }
 
-bool OwnerDocument(IXMLDOMNode* node, ComPtr<IXMLDOMDocument>* doc) {
+HRESULT NodeInDocument(IUnknown* object, const wchar_t* notNodeMessage,
+                       const wchar_t* noOwnerMessage, ComPtr<IXMLDOMNode>* node,
+                       ComPtr<IXMLDOMDocument>* doc) {
+    *node = Query<IXMLDOMNode>(object, IID_IXMLDOMNode);
+    if (!*node) {
+        Message(notNodeMessage);
+        return E_POINTER;
+    }
     DOMNodeType type = NODE_INVALID;
-    return node->get_nodeType(&type) == S_OK && type != NODE_DOCUMENT &&
-           node->get_ownerDocument(doc->ReleaseAndGetAddressOf()) == S_OK && *doc;
+    if ((*node)->get_nodeType(&type) != S_OK || type == NODE_DOCUMENT ||
+        (*node)->get_ownerDocument(doc->ReleaseAndGetAddressOf()) != S_OK || !*doc) {
+        Message(noOwnerMessage);
+        return E_POINTER;
+    }
+    return S_OK;
 }
 
 bool AcceptsChild(IXMLDOMNode* parent, IXMLDOMNode* child) {

@@ -34,9 +34,12 @@ ComPtr<T> Query(IUnknown* object, REFIID iid) {
 // Stores object's IUnknown in *out for the caller; *out is untouched on failure.
 HRESULT HandOut(IUnknown* object, IUnknown** out);
 
-// The document a node belongs to. False for a document itself, which
-// belongs to none (whatever the DOM answers).
-bool OwnerDocument(IXMLDOMNode* node, ComPtr<IXMLDOMDocument>* doc);
+// The node object stands for and the document it belongs to (a document
+// itself belongs to none, whatever the DOM answers). E_POINTER after the
+// matching message when either is missing.
+HRESULT NodeInDocument(IUnknown* object, const wchar_t* notNodeMessage,
+                       const wchar_t* noOwnerMessage, ComPtr<IXMLDOMNode>* node,
+                       ComPtr<IXMLDOMDocument>* doc);
 
 // Whether parent may take child as its last child. Some DOM implementations
 // accept children of a comment or a second root element and leave a tree
