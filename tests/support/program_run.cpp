@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cstdio>
 
+#include "tests/support/entry_stop.h"
 #include "tests/support/file_util.h"
 #include "tests/support/test_paths.h"
 
@@ -63,14 +64,20 @@ std::string ReadDebugString(HANDLE process, const OUTPUT_DEBUG_STRING_INFO& info
 }  // namespace
 
 RunResult RunDebuggee(const std::wstring& commandLine, const std::wstring& workingDir,
-                      DWORD timeoutMs) {
+                      DWORD timeoutMs, const DebuggeeHooks& hooks) {
     RunResult result;
     std::wstring line = commandLine;
     STARTUPINFOW startup = {};
     startup.cb = sizeof(startup);
     PROCESS_INFORMATION process = {};
-    if (!CreateProcessW(nullptr, &line[0], nullptr, nullptr, FALSE, DEBUG_ONLY_THIS_PROCESS,
-                        nullptr, workingDir.c_str(), &startup, &process)) {
+    const bool created =
+        hooks.token != nullptr
+            ? CreateProcessAsUserW(hooks.token, nullptr, &line[0], nullptr, nullptr, FALSE,
+                                   DEBUG_ONLY_THIS_PROCESS, nullptr, workingDir.c_str(), &startup,
+                                   &process)
+            : CreateProcessW(nullptr, &line[0], nullptr, nullptr, FALSE, DEBUG_ONLY_THIS_PROCESS,
+                             nullptr, workingDir.c_str(), &startup, &process);
+    if (!created) {
         result.exitCode = -9999;
         result.crashed = true;
         return result;
@@ -92,6 +99,9 @@ RunResult RunDebuggee(const std::wstring& commandLine, const std::wstring& worki
                     ReadDebugString(process.hProcess, event.u.DebugString));
                 break;
             case EXCEPTION_DEBUG_EVENT: {
+                if (hooks.stop != nullptr && hooks.stop->OnException(process.hProcess, event)) {
+                    break;
+                }
                 const DWORD code = event.u.Exception.ExceptionRecord.ExceptionCode;
                 if (code != EXCEPTION_BREAKPOINT && code != 0x4000001F /* WOW64 breakpoint */) {
                     status = DBG_EXCEPTION_NOT_HANDLED;
@@ -136,12 +146,14 @@ ProgramUnderTest::ProgramUnderTest(const std::wstring& folder, const ProgramOpti
     m_env[L"QM_FAKE_CALLS_LOG"] = callsLogPath();
 }
 
-RunResult ProgramUnderTest::Run(const std::wstring& arguments, DWORD timeoutMs) {
+RunResult ProgramUnderTest::Run(const std::wstring& arguments, DWORD timeoutMs,
+                                const DebuggeeHooks& hooks) {
     return RunRaw(L"\"" + m_exePath + L"\"" + (arguments.empty() ? L"" : L" " + arguments),
-                  timeoutMs);
+                  timeoutMs, hooks);
 }
 
-RunResult ProgramUnderTest::RunRaw(const std::wstring& commandLine, DWORD timeoutMs) {
+RunResult ProgramUnderTest::RunRaw(const std::wstring& commandLine, DWORD timeoutMs,
+                                   const DebuggeeHooks& hooks) {
     // The program inherits this process's environment, changed for the run.
     std::map<std::wstring, std::wstring> saved;
     for (const auto& [name, value] : m_env) {
@@ -151,7 +163,7 @@ RunResult ProgramUnderTest::RunRaw(const std::wstring& commandLine, DWORD timeou
     }
     DeleteFileW(m_env[L"QM_FAKE_TRACE_LOG"].c_str());
     DeleteFileW(callsLogPath().c_str());
-    RunResult result = RunDebuggee(commandLine, m_folder, timeoutMs);
+    RunResult result = RunDebuggee(commandLine, m_folder, timeoutMs, hooks);
     result.traces = ReadTraceLog(m_env[L"QM_FAKE_TRACE_LOG"]);
     for (const auto& [name, value] : saved) {
         SetEnvironmentVariableW(name.c_str(), value.empty() ? nullptr : value.c_str());

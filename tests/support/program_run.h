@@ -32,10 +32,19 @@ struct RunResult {
     bool HasDebugOutput(const std::string& text) const;
 };
 
+class EntryStop;
+
+// Extras of a run: the primary token to start the program with (instead of
+// the test's own), and a stop at a system function's entry.
+struct DebuggeeHooks {
+    HANDLE token = nullptr;
+    EntryStop* stop = nullptr;
+};
+
 // Runs commandLine as a debuggee in workingDir until it ends (or is killed
 // after timeoutMs).
 RunResult RunDebuggee(const std::wstring& commandLine, const std::wstring& workingDir,
-                      DWORD timeoutMs);
+                      DWORD timeoutMs, const DebuggeeHooks& hooks = {});
 
 enum class TraceLibrary {
     kBoth,     // exports both entry points
@@ -62,9 +71,11 @@ public:
     void SetEnv(const std::wstring& name, const std::wstring& value) { m_env[name] = value; }
 
     // Runs with `arguments` after the quoted program path, in its folder.
-    RunResult Run(const std::wstring& arguments, DWORD timeoutMs = 60000);
+    RunResult Run(const std::wstring& arguments, DWORD timeoutMs = 60000,
+                  const DebuggeeHooks& hooks = {});
     // Runs with exactly this command line (program name included).
-    RunResult RunRaw(const std::wstring& commandLine, DWORD timeoutMs = 60000);
+    RunResult RunRaw(const std::wstring& commandLine, DWORD timeoutMs = 60000,
+                     const DebuggeeHooks& hooks = {});
 
 private:
     std::wstring m_folder;
