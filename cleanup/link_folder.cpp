@@ -32,20 +32,56 @@ CStringEx ShortForm(const wchar_t* path) {
     return CStringEx(shortPath);
 }
 
-// A rule with its target already in short form.
-struct Matcher {
+// A rule; the short form of its target is looked up when first needed.
+class Matcher {
+public:
     Matcher(const wchar_t* target, const wchar_t* arguments)
-        : shortTarget(ShortForm(target)), arguments(arguments) {}
+        : m_target(target), m_arguments(arguments) {}
 
-    bool Matches(const LinkFields& link) const {
-        return !link.target.IsEmpty() &&
-               ShortForm(link.target.c_str()).CompareNoCase(shortTarget.c_str()) == 0 &&
-               (arguments == nullptr || link.arguments.CompareNoCase(arguments) == 0);
+    // The link's target as it reads equals the rule's target.
+    bool MatchesAsWritten(const LinkFields& link) const {
+        return MatchesArguments(link) && link.target.CompareNoCase(m_target.c_str()) == 0;
+    }
+    // The link's target in short form equals the rule's in short form.
+    bool MatchesInShortForm(const LinkFields& link, const CStringEx& linkShortTarget) {
+        if (!m_shortTargetKnown) {
+            m_shortTarget = ShortForm(m_target.c_str());
+            m_shortTargetKnown = true;
+        }
+        return MatchesArguments(link) && linkShortTarget.CompareNoCase(m_shortTarget.c_str()) == 0;
     }
 
-    CStringEx shortTarget;
-    const wchar_t* arguments;
+private:
+    bool MatchesArguments(const LinkFields& link) const {
+        return m_arguments == nullptr || link.arguments.CompareNoCase(m_arguments) == 0;
+    }
+
+    CStringEx m_target;
+    const wchar_t* m_arguments;
+    CStringEx m_shortTarget;
+    bool m_shortTargetKnown = false;
 };
+
+// Whether the link matches any of the rules. Short forms, which cost file
+// system look-ups, are compared only when no rule matches the target as it
+// reads.
+bool MatchesAny(const LinkFields& link, std::vector<Matcher>& matchers) {
+    if (link.target.IsEmpty()) {
+        return false;
+    }
+    for (const Matcher& matcher : matchers) {
+        if (matcher.MatchesAsWritten(link)) {
+            return true;
+        }
+    }
+    const CStringEx linkShortTarget = ShortForm(link.target.c_str());
+    for (Matcher& matcher : matchers) {
+        if (matcher.MatchesInShortForm(link, linkShortTarget)) {
+            return true;
+        }
+    }
+    return false;
+}
 
 bool EndsWithLinkExtension(const wchar_t* name) {
     size_t length = wcslen(name);
@@ -80,15 +116,6 @@ FolderLinks ListLinks(const wchar_t* folder) {
         }
     } while (FindNextFileW(find.get(), &entry));
     return found;
-}
-
-bool MatchesAny(const LinkFields& link, const std::vector<Matcher>& matchers) {
-    for (const Matcher& matcher : matchers) {
-        if (matcher.Matches(link)) {
-            return true;
-        }
-    }
-    return false;
 }
 
 // One path for SHFileOperationW: the list ends with a second terminator.
@@ -154,13 +181,13 @@ int UpdateLinkIcon(HWND owner, const wchar_t* folder, const wchar_t* target,
     if (links.entries == 0) {
         return E_FAIL;
     }
-    const Matcher matcher(target, arguments);
+    std::vector<Matcher> matchers = {Matcher(target, arguments)};
     int saved = 0;
     for (const CStringEx& path : links.files) {
         ShellLinkFile link;
         LinkFields fields;
         if (FAILED(link.Load(owner, path.c_str())) || FAILED(link.Read(fields)) ||
-            !matcher.Matches(fields)) {
+            !MatchesAny(fields, matchers)) {
             continue;
         }
         link.Link()->SetIconLocation(iconPath != nullptr ? iconPath : L"", iconIndex);
@@ -186,13 +213,13 @@ int UpdateLinkName(HWND owner, const wchar_t* folder, const wchar_t* target,
     if (!IsGiven(newLinkPath)) {
         return 0;
     }
-    const Matcher matcher(target, arguments);
+    std::vector<Matcher> matchers = {Matcher(target, arguments)};
     const CStringEx newPath(newLinkPath);
     int renamed = 0;
     for (const CStringEx& path : links.files) {
         LinkFields link;
         if (path.CompareNoCase(newLinkPath) != 0 &&
-            SUCCEEDED(ReadLink(owner, path.c_str(), link)) && matcher.Matches(link) &&
+            SUCCEEDED(ReadLink(owner, path.c_str(), link)) && MatchesAny(link, matchers) &&
             ShellFileOperation(owner, FO_RENAME, path, &newPath, kRenameFlags)) {
             renamed = 1;
         }

@@ -348,7 +348,11 @@ TEST_P(RemoveShortcutsTest, RemovesOnlyTheSuitesShortcuts) {
     std::wstring otherVendor = JoinPath(m_userPrograms, L"Other Vendor");
     Plant(otherVendor, kOneClickLink, InRoot(L"qmoneclk.exe"));
     Plant(m_commonDesktop, L"Notepad.lnk", kNotepad);
-    Plant(m_userDesktop, L"Join.lnk", InRoot(L"qmoneclk.exe"), L"/now");
+    // Written in short form, as Windows reads every shortcut's target.
+    wchar_t shortTarget[MAX_PATH] = {};
+    ASSERT_NE(0u, GetShortPathNameW(InRoot(L"qmoneclk.exe").c_str(), shortTarget, MAX_PATH));
+    ASSERT_NE(InRoot(L"qmoneclk.exe"), shortTarget);
+    Plant(m_userDesktop, L"Join.lnk", shortTarget, L"/now");
 
     RunKeyword(GetParam());
     std::vector<std::wstring> kept = {L"Broken.lnk", L"Gone.lnk", L"Log.lnk", L"Long.lnk",
