@@ -15,6 +15,7 @@
 
 #include "cleanup/shell_link.h"
 #include "tests/e2e/suite_install.h"
+#include "tests/support/host_link.h"
 #include "tests/support/machine_fixture.h"
 
 namespace {
@@ -366,5 +367,20 @@ TEST_P(RemoveShortcutsTest, RemovesOnlyTheSuitesShortcuts) {
 
 INSTANTIATE_TEST_SUITE_P(Keywords, RemoveShortcutsTest,
                          ::testing::Values(L"delshortcuts", L"delunuseddata"));
+
+// A Start-menu folder of the suite that is a link planted by the user: no
+// shortcut is written through it, and none it leads to is deleted.
+TEST_F(ShortcutsTest, NoShortcutWorkGoesThroughAPlantedLink) {
+    std::wstring elsewhere = m_scratch.Sub(L"elsewhere", true);
+    Plant(elsewhere, L"Join.lnk", InRoot(L"qmoneclk.exe"));
+    HostLink planted(JoinPath(m_userPrograms, kDefaultFolder), elsewhere);
+    ASSERT_TRUE(planted.ok());
+    for (const wchar_t* keyword : {L"addshortcuts", L"updateshortcuts", L"delshortcuts"}) {
+        RunResult run = RunKeyword(keyword);
+        EXPECT_TRUE(run.HasTraceContaining("refused to go through a reparse point"))
+            << Narrow(keyword);
+        EXPECT_EQ(std::vector<std::wstring>{L"Join.lnk"}, ListDir(elsewhere)) << Narrow(keyword);
+    }
+}
 
 }  // namespace
