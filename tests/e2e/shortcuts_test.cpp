@@ -1,15 +1,13 @@
-// The shortcut keywords end to end, each shortcut read back through the shell
+// The shortcut keywords end to end, the shortcuts read back through the shell
 // link object: where addshortcuts puts them and what they point at, how
 // updateshortcuts renames an older release's shortcuts and which job follows,
-// and what delshortcuts (and delunuseddata) removes and leaves. Only the
-// scratch prefix's own folders are used: its desktop is a real folder there.
+// and what delshortcuts and delunuseddata remove and leave.
 #include <windows.h>
 #include <objbase.h>
 #include <shlobj.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <memory>
 #include <string>
 #include <vector>
 
@@ -21,15 +19,14 @@
 namespace {
 
 using namespace suite_install;
+using Names = std::vector<std::wstring>;
 
 const REGSAM k64 = KEY_WOW64_64KEY;
 const wchar_t kProductCode[] = L"{6F1B2C3D-4E5F-4A6B-8C7D-9E0F1A2B3C4D}";
 const wchar_t kDefaultFolder[] = L"Mirovan Meetings";
 const wchar_t kSuiteFolder[] = L"Mirovan Meeting Center";  // string 3145
-const wchar_t kCompanionName[] = L"Mirovan Meeting Center";
 const wchar_t kOneClickLink[] = L"Mirovan Meetings.lnk";
 const wchar_t kSettingsLink[] = L"Quillmark Tools Settings.lnk";
-const wchar_t kHelpLink[] = L"Quillmark Tools Help.lnk";
 const wchar_t kUninstallLink[] = L"Uninstall Quillmark Tools.lnk";
 const wchar_t kMsiexec[] = L"C:\\windows\\syswow64\\msiexec.exe";
 const wchar_t kNotepad[] = L"C:\\windows\\notepad.exe";
@@ -38,11 +35,6 @@ std::wstring ShellFolder(int csidl) {
     wchar_t path[MAX_PATH] = {};
     SHGetFolderPathW(nullptr, csidl, nullptr, SHGFP_TYPE_DEFAULT, path);
     return path;
-}
-
-std::wstring Upper(std::wstring text) {
-    CharUpperW(&text[0]);
-    return text;
 }
 
 struct ExpectedLink {
@@ -55,25 +47,14 @@ struct ExpectedLink {
 
 class ShortcutsTest : public MachineTest {
 protected:
-    ShortcutsTest()
-        : m_root(Program().folder()),
-          m_userPrograms(ShellFolder(CSIDL_PROGRAMS)),
-          m_commonPrograms(ShellFolder(CSIDL_COMMON_PROGRAMS)),
-          m_userDesktop(ShellFolder(CSIDL_DESKTOP)),
-          m_commonDesktop(ShellFolder(CSIDL_COMMON_DESKTOPDIRECTORY)) {
+    ShortcutsTest() : m_root(Program().folder()) {
         CoInitialize(nullptr);
         InstallSuite(m_root, kProductCode);
     }
-
     ~ShortcutsTest() override {
-        for (const std::wstring& programs : {m_userPrograms, m_commonPrograms}) {
+        for (const std::wstring& programs : m_programs) {
             for (const wchar_t* folder : {kDefaultFolder, kSuiteFolder, L"Other Vendor"}) {
                 RemoveTree(JoinPath(programs, folder));
-            }
-            for (const std::wstring& name : ListDir(programs)) {
-                if (name.size() > 4 && Upper(name.substr(name.size() - 4)) == L".LNK") {
-                    RemoveTree(JoinPath(programs, name));
-                }
             }
         }
         for (const std::wstring& desktop : {m_userDesktop, m_commonDesktop}) {
@@ -81,22 +62,23 @@ protected:
                 RemoveTree(JoinPath(desktop, name));
             }
         }
+        RemoveProducts();
         CoUninitialize();
     }
-
     void SetUp() override {
-        // Never the host's home folder behind a linked desktop.
+        // The prefix's own desktop folder, never the host's home behind a link.
         ASSERT_EQ(0u, GetFileAttributesW(m_userDesktop.c_str()) & FILE_ATTRIBUTE_REPARSE_POINT);
     }
 
     std::wstring InRoot(const wchar_t* name) const { return JoinPath(m_root, name); }
 
     std::vector<ExpectedLink> SuiteLinks() const {
+        std::wstring oneClick = InRoot(L"qmoneclk.exe");
         return {
-            {kOneClickLink, InRoot(L"qmoneclk.exe"), L"", InRoot(L"qmoneclk.exe"), 0},
+            {kOneClickLink, oneClick, L"", oneClick, 0},
             {kSettingsLink, InRoot(L"qminst.exe"), L"/OpenSetting=1", InRoot(L"qmRes.dll"), 3},
-            {kHelpLink, InRoot(L"qminst.exe"), L"/help for quillmark tools", InRoot(L"qmRes.dll"),
-             2},
+            {L"Quillmark Tools Help.lnk", InRoot(L"qminst.exe"), L"/help for quillmark tools",
+             InRoot(L"qmRes.dll"), 2},
             {kUninstallLink, kMsiexec, std::wstring(L"/x ") + kProductCode, L"", 0},
         };
     }
@@ -106,17 +88,17 @@ protected:
         SCOPED_TRACE(Narrow(path));
         LinkFields link;
         ASSERT_HRESULT_SUCCEEDED(ReadLink(nullptr, path.c_str(), link));
-        EXPECT_EQ(Upper(expected.target), Upper(link.target.c_str()));
-        EXPECT_EQ(expected.arguments, link.arguments.c_str());
-        EXPECT_EQ(Upper(m_root), Upper(link.workingDir.c_str()));
+        EXPECT_STRCASEEQ(Narrow(expected.target).c_str(), Narrow(link.target.c_str()).c_str());
+        EXPECT_STREQ(expected.arguments.c_str(), link.arguments.c_str());
+        EXPECT_STRCASEEQ(Narrow(m_root).c_str(), Narrow(link.workingDir.c_str()).c_str());
         // Wine reports a shortcut without an icon as having its target's.
-        std::wstring icon = expected.iconPath.empty() ? expected.target : expected.iconPath;
-        EXPECT_EQ(Upper(icon), Upper(link.iconPath.c_str()));
+        const std::wstring& icon = expected.iconPath.empty() ? expected.target : expected.iconPath;
+        EXPECT_STRCASEEQ(Narrow(icon).c_str(), Narrow(link.iconPath.c_str()).c_str());
         EXPECT_EQ(expected.iconIndex, link.iconIndex);
     }
 
     void ExpectSuiteFolder(const std::wstring& folder) {
-        std::vector<std::wstring> names;
+        Names names;
         for (const ExpectedLink& link : SuiteLinks()) {
             names.push_back(link.name);
             ExpectLink(folder, link);
@@ -135,49 +117,44 @@ protected:
 
     RunResult RunKeyword(const wchar_t* keyword) {
         RunResult run = Program().Run(std::wstring(L"-") + keyword);
-        EXPECT_FALSE(run.crashed);
-        EXPECT_FALSE(run.timedOut);
+        EXPECT_FALSE(run.crashed || run.timedOut) << Narrow(keyword);
         EXPECT_EQ(0, run.exitCode);
         return run;
     }
 
     std::wstring m_root;
-    std::wstring m_userPrograms;
-    std::wstring m_commonPrograms;
-    std::wstring m_userDesktop;
-    std::wstring m_commonDesktop;
+    const std::wstring m_programs[2] = {ShellFolder(CSIDL_PROGRAMS),
+                                        ShellFolder(CSIDL_COMMON_PROGRAMS)};
+    const std::wstring m_userDesktop = ShellFolder(CSIDL_DESKTOP);
+    const std::wstring m_commonDesktop = ShellFolder(CSIDL_COMMON_DESKTOPDIRECTORY);
 };
 
-// Where addshortcuts puts the Start-menu shortcuts, by what names the
-// companion application.
+// The Start-menu folder, by how the companion application is registered.
 struct FolderCase {
-    const char* name;
-    int code;  // the companion's upgrade code, -1 for none
+    int code;  // its upgrade code, -1 for none
     REGSAM view;
-    const wchar_t* appName;  // "AppName", or null
-    bool displayNameIsText;
+    const wchar_t* displayName;  // null: a number instead of a name
+    const wchar_t* appName;      // the suite's "AppName", or null
     const wchar_t* expectedFolder;
 };
 
 const FolderCase kFolderCases[] = {
-    {"no companion, no AppName", -1, 0, nullptr, true, kDefaultFolder},
-    {"first upgrade code, 64-bit view", 0, k64, nullptr, true, kSuiteFolder},
-    {"first upgrade code is not looked up in the 32-bit view", 0, 0, nullptr, true, kDefaultFolder},
-    {"last upgrade code, 32-bit view", 3, 0, nullptr, true, kSuiteFolder},
-    {"AppName only", -1, 0, L"Mirovan", true, kSuiteFolder},
-    {"DisplayName not a string", 1, k64, nullptr, false, kDefaultFolder},
+    {-1, 0, nullptr, nullptr, kDefaultFolder},    // none
+    {0, k64, L"Mirovan", nullptr, kSuiteFolder},  // the first code, 64-bit view
+    {0, 0, L"Mirovan", nullptr, kDefaultFolder},  // the first code is not looked up in 32 bits
+    {3, 0, L"Mirovan", nullptr, kSuiteFolder},    // the last code, 32-bit view
+    {-1, 0, nullptr, L"Mirovan", kSuiteFolder},   // "AppName" only
+    {1, k64, nullptr, nullptr, kDefaultFolder},   // a "DisplayName" that is no text
 };
 
 class AddShortcutsTest : public ShortcutsTest, public ::testing::WithParamInterface<FolderCase> {};
 
 TEST_P(AddShortcutsTest, CreatesTheSuiteShortcutsInTheCompanionsFolder) {
     const FolderCase& c = GetParam();
-    SCOPED_TRACE(c.name);
-    std::unique_ptr<InstalledProduct> companion;
     if (c.code >= 0) {
-        companion = std::make_unique<InstalledProduct>(c.code, c.view, c.view);
-        if (c.displayNameIsText) {
-            RegPutString(HKEY_LOCAL_MACHINE, kUninstallEntry, L"DisplayName", kCompanionName,
+        RegisterProduct(c.code, c.view, c.view);
+        if (c.displayName != nullptr) {
+            RegPutString(HKEY_LOCAL_MACHINE, kUninstallEntry, L"DisplayName", c.displayName,
                          c.view);
         } else {
             RegPutDword(HKEY_LOCAL_MACHINE, kUninstallEntry, L"DisplayName", 1, c.view);
@@ -188,148 +165,114 @@ TEST_P(AddShortcutsTest, CreatesTheSuiteShortcutsInTheCompanionsFolder) {
     }
     RunResult run = RunKeyword(L"addshortcuts");
     EXPECT_TRUE(run.HasTrace(" qmmirovanoni.exe: Call addshortcutslinks.\n,\n"));
-    const wchar_t* otherFolder = c.expectedFolder == kSuiteFolder ? kDefaultFolder : kSuiteFolder;
-    for (const std::wstring& programs : {m_userPrograms, m_commonPrograms}) {
+    const wchar_t* other = c.expectedFolder == kSuiteFolder ? kDefaultFolder : kSuiteFolder;
+    for (const std::wstring& programs : m_programs) {
         ExpectSuiteFolder(JoinPath(programs, c.expectedFolder));
-        EXPECT_FALSE(DirExists(JoinPath(programs, otherFolder)));
+        EXPECT_FALSE(DirExists(JoinPath(programs, other)));
     }
     // The one-click shortcut on the common desktop, and so not on the user's.
-    EXPECT_EQ(std::vector<std::wstring>{kOneClickLink}, ListDir(m_commonDesktop));
+    EXPECT_EQ(Names{kOneClickLink}, ListDir(m_commonDesktop));
     ExpectLink(m_commonDesktop, SuiteLinks()[0]);
     EXPECT_TRUE(ListDir(m_userDesktop).empty());
 }
 
-INSTANTIATE_TEST_SUITE_P(Folders, AddShortcutsTest, ::testing::ValuesIn(kFolderCases),
-                         [](const ::testing::TestParamInfo<FolderCase>& info) {
-                             return "Case" + std::to_string(info.index);
-                         });
+INSTANTIATE_TEST_SUITE_P(Folders, AddShortcutsTest, ::testing::ValuesIn(kFolderCases));
 
-// Texts that cannot name a file and a product code that is not a string:
-// whatever cannot be named is left out, and nothing lands in the program
-// folders themselves.
+// Texts that cannot name a file (missing, or 260 characters long) and a
+// product code that is no text: what cannot be named is left out, and
+// nothing lands in the program folders themselves.
 struct BrokenCase {
-    const char* name;
-    bool companion;  // the folder name then comes from the missing string 3145
+    bool companion;  // the folder is then named by the missing string 3145
     bool productCodeIsText;
-    std::vector<std::wstring> expectedInDefaultFolder;
+    Names inDefaultFolder;
 };
 
 const BrokenCase kBrokenCases[] = {
-    {"texts missing or 260 characters long", false, true, {kUninstallLink}},
-    {"folder name missing", true, true, {}},
-    {"product code not a string", false, false, {}},
+    {false, true, {kUninstallLink}},
+    {true, true, {}},
+    {false, false, {}},
 };
 
 class BrokenInputTest : public ShortcutsTest, public ::testing::WithParamInterface<BrokenCase> {};
 
 TEST_P(BrokenInputTest, CreatesOnlyWhatItCanName) {
     const BrokenCase& c = GetParam();
-    SCOPED_TRACE(c.name);
-    UseTexts(m_root, L"badtexts\\");
-    std::unique_ptr<InstalledProduct> companion;
+    UseTexts(m_root, c.productCodeIsText ? L"badtexts\\" : L"");
     if (c.companion) {
-        companion = std::make_unique<InstalledProduct>(0, k64, k64);
-        RegPutString(HKEY_LOCAL_MACHINE, kUninstallEntry, L"DisplayName", kCompanionName, k64);
+        RegisterProduct(0, k64, k64);
+        RegPutString(HKEY_LOCAL_MACHINE, kUninstallEntry, L"DisplayName", L"Mirovan", k64);
     }
     if (!c.productCodeIsText) {
-        UseTexts(m_root);
         RegPutDword(HKEY_LOCAL_MACHINE, kSuiteKey, L"ProductCode", 1);
     }
-    std::vector<std::wstring> userProgramsBefore = ListDir(m_userPrograms);
-    std::vector<std::wstring> commonProgramsBefore = ListDir(m_commonPrograms);
+    const Names before[] = {ListDir(m_programs[0]), ListDir(m_programs[1])};
     RunKeyword(L"addshortcuts");
-    for (const std::wstring& programs : {m_userPrograms, m_commonPrograms}) {
-        std::wstring folder = JoinPath(programs, kDefaultFolder);
-        EXPECT_EQ(c.expectedInDefaultFolder, ListDir(folder));
-        EXPECT_FALSE(DirExists(JoinPath(programs, kSuiteFolder)));
-    }
-    if (c.expectedInDefaultFolder.empty()) {
-        EXPECT_EQ(userProgramsBefore, ListDir(m_userPrograms));
-        EXPECT_EQ(commonProgramsBefore, ListDir(m_commonPrograms));
-    } else {
-        ExpectLink(JoinPath(m_userPrograms, kDefaultFolder), SuiteLinks()[3]);
+    for (int i = 0; i < 2; ++i) {
+        EXPECT_EQ(c.inDefaultFolder, ListDir(JoinPath(m_programs[i], kDefaultFolder)));
+        Names after = ListDir(m_programs[i]);
+        after.erase(std::remove(after.begin(), after.end(), kDefaultFolder), after.end());
+        EXPECT_EQ(before[i], after);
     }
     EXPECT_TRUE(ListDir(m_commonDesktop).empty());
     EXPECT_TRUE(ListDir(m_userDesktop).empty());
 }
 
-INSTANTIATE_TEST_SUITE_P(Inputs, BrokenInputTest, ::testing::ValuesIn(kBrokenCases),
-                         [](const ::testing::TestParamInfo<BrokenCase>& info) {
-                             return "Case" + std::to_string(info.index);
-                         });
+INSTANTIATE_TEST_SUITE_P(Inputs, BrokenInputTest, ::testing::ValuesIn(kBrokenCases));
 
 TEST_F(ShortcutsTest, UpdateRenamesAnOlderReleasesShortcutsAndMovesThemToTheSuiteFolder) {
     // An older release's shortcuts, under old names and with old icons, in
     // the folder named after the companion's product (there is no companion).
     const wchar_t* oldIcon = L"C:\\old\\icons.dll";
-    for (const std::wstring& programs : {m_userPrograms, m_commonPrograms}) {
+    const ExpectedLink help = {L"Guide.lnk", InRoot(L"qminst.exe"), L"/help for quillmark tools",
+                               oldIcon, 7};
+    for (const std::wstring& programs : m_programs) {
         std::wstring folder = JoinPath(programs, kDefaultFolder);
         Plant(folder, L"Join.lnk", InRoot(L"qmoneclk.exe"), nullptr, oldIcon, 5);
         Plant(folder, L"Options.lnk", InRoot(L"qminst.exe"), L"/OpenSetting=1", oldIcon, 6);
-        Plant(folder, L"Guide.lnk", InRoot(L"qminst.exe"), L"/help for quillmark tools", oldIcon,
-              7);
+        Plant(folder, help.name, help.target, help.arguments.c_str(), oldIcon, 7);
     }
     Plant(m_commonDesktop, L"Join.lnk", InRoot(L"qmoneclk.exe"), nullptr, oldIcon, 5);
 
     RunResult run = RunKeyword(L"updateshortcuts");
     EXPECT_TRUE(run.HasTrace(" qmmirovanoni.exe: Call udpateshortlinks.\n,\n"));
-    std::vector<ExpectedLink> current = SuiteLinks();
-    for (const std::wstring& programs : {m_userPrograms, m_commonPrograms}) {
+    for (const std::wstring& programs : m_programs) {
         std::wstring oldFolder = JoinPath(programs, kDefaultFolder);
         std::wstring newFolder = JoinPath(programs, kSuiteFolder);
         EXPECT_FALSE(DirExists(oldFolder));
-        std::vector<std::wstring> expected = {L"Guide.lnk", kOneClickLink, kSettingsLink};
-        EXPECT_EQ(expected, ListDir(newFolder));
-        ExpectLink(newFolder, current[0]);
-        ExpectLink(newFolder, current[1]);
-        ExpectLink(newFolder,
-                   {L"Guide.lnk", InRoot(L"qminst.exe"), L"/help for quillmark tools", oldIcon, 7});
+        EXPECT_EQ((Names{L"Guide.lnk", kOneClickLink, kSettingsLink}), ListDir(newFolder));
+        ExpectLink(newFolder, SuiteLinks()[0]);
+        ExpectLink(newFolder, SuiteLinks()[1]);
+        ExpectLink(newFolder, help);
         EXPECT_TRUE(run.HasTrace("MoveLinkTargetIcon lpszLinkSrcDir=" + Narrow(oldFolder) +
                                  ",lpszLinkDesDir=" + Narrow(newFolder) + ",lpszIconName=,\n"));
     }
-    EXPECT_EQ(std::vector<std::wstring>{kOneClickLink}, ListDir(m_commonDesktop));
-    ExpectLink(m_commonDesktop, current[0]);
+    EXPECT_EQ(Names{kOneClickLink}, ListDir(m_commonDesktop));
+    ExpectLink(m_commonDesktop, SuiteLinks()[0]);
     // A desktop shortcut was renamed: the shortcuts are moved, not added.
     EXPECT_TRUE(ListDir(m_userDesktop).empty());
 }
 
-// Which job follows the renames: shortcuts are added again only when both
-// desktops hold shortcuts and none had to be renamed.
-struct FollowUpCase {
-    const char* name;
-    bool userDesktopHoldsAShortcut;
-    bool addShortcutsRuns;
-};
-
-const FollowUpCase kFollowUpCases[] = {
-    {"both desktops hold shortcuts, none renamed", true, true},
-    {"the user's desktop holds none", false, false},
-};
-
-class UpdateFollowUpTest : public ShortcutsTest,
-                           public ::testing::WithParamInterface<FollowUpCase> {};
+// The job after the renames: shortcuts are added only when both desktops
+// hold shortcuts and none was renamed (parameter: the user's desktop holds
+// one); else they are moved.
+class UpdateFollowUpTest : public ShortcutsTest, public ::testing::WithParamInterface<bool> {};
 
 TEST_P(UpdateFollowUpTest, AddsShortcutsOnlyWhenNoDesktopShortcutWasRenamed) {
-    const FollowUpCase& c = GetParam();
-    SCOPED_TRACE(c.name);
     Plant(m_commonDesktop, kOneClickLink, InRoot(L"qmoneclk.exe"));
-    if (c.userDesktopHoldsAShortcut) {
+    if (GetParam()) {
         Plant(m_userDesktop, L"Notepad.lnk", kNotepad);
     }
     RunKeyword(L"updateshortcuts");
-    for (const std::wstring& programs : {m_userPrograms, m_commonPrograms}) {
-        EXPECT_EQ(c.addShortcutsRuns, DirExists(JoinPath(programs, kDefaultFolder)));
+    for (const std::wstring& programs : m_programs) {
+        EXPECT_EQ(GetParam(), DirExists(JoinPath(programs, kDefaultFolder)));
     }
-    EXPECT_EQ(std::vector<std::wstring>{kOneClickLink}, ListDir(m_commonDesktop));
+    EXPECT_EQ(Names{kOneClickLink}, ListDir(m_commonDesktop));
 }
 
-INSTANTIATE_TEST_SUITE_P(Desktops, UpdateFollowUpTest, ::testing::ValuesIn(kFollowUpCases),
-                         [](const ::testing::TestParamInfo<FollowUpCase>& info) {
-                             return "Case" + std::to_string(info.index);
-                         });
+INSTANTIATE_TEST_SUITE_P(Desktops, UpdateFollowUpTest, ::testing::Bool());
 
-// delshortcuts and delunuseddata remove the suite's shortcuts (the uninstall
-// shortcut whatever its arguments) and nothing else: not a qminst.exe
+// The suite's shortcuts go (the uninstall shortcut whatever its arguments,
+// the one-click shortcut on the desktops), nothing else: not a qminst.exe
 // shortcut with other arguments, another program's shortcut, files that are
 // no shortcuts or whose targets are missing or too long, nor a shortcut in
 // another vendor's folder. A folder left empty goes.
@@ -338,15 +281,14 @@ class RemoveShortcutsTest : public ShortcutsTest,
 
 TEST_P(RemoveShortcutsTest, RemovesOnlyTheSuitesShortcuts) {
     RunKeyword(L"addshortcuts");
-    std::wstring userFolder = JoinPath(m_userPrograms, kDefaultFolder);
-    ASSERT_TRUE(DirExists(userFolder));
-    Plant(userFolder, L"Repair.lnk", kMsiexec, L"/fa {00000000-0000-0000-0000-000000000000}");
-    Plant(userFolder, L"Log.lnk", InRoot(L"qminst.exe"), L"/log");
-    Plant(userFolder, L"Notepad.lnk", kNotepad);
-    Plant(userFolder, L"Gone.lnk", InRoot(L"gone.exe"));
-    Plant(userFolder, L"Long.lnk", m_root + L"\\" + std::wstring(280, L'x') + L".exe");
-    ASSERT_TRUE(WriteFileBytes(JoinPath(userFolder, L"Broken.lnk"), "not a shortcut"));
-    std::wstring otherVendor = JoinPath(m_userPrograms, L"Other Vendor");
+    std::wstring folder = JoinPath(m_programs[0], kDefaultFolder);
+    Plant(folder, L"Repair.lnk", kMsiexec, L"/fa {00000000-0000-0000-0000-000000000000}");
+    Plant(folder, L"Log.lnk", InRoot(L"qminst.exe"), L"/log");
+    Plant(folder, L"Notepad.lnk", kNotepad);
+    Plant(folder, L"Gone.lnk", InRoot(L"gone.exe"));
+    Plant(folder, L"Long.lnk", m_root + L"\\" + std::wstring(280, L'x') + L".exe");
+    ASSERT_TRUE(WriteFileBytes(JoinPath(folder, L"Broken.lnk"), "not a shortcut"));
+    std::wstring otherVendor = JoinPath(m_programs[0], L"Other Vendor");
     Plant(otherVendor, kOneClickLink, InRoot(L"qmoneclk.exe"));
     Plant(m_commonDesktop, L"Notepad.lnk", kNotepad);
     // Written in short form, as Windows reads every shortcut's target.
@@ -356,30 +298,28 @@ TEST_P(RemoveShortcutsTest, RemovesOnlyTheSuitesShortcuts) {
     Plant(m_userDesktop, L"Join.lnk", shortTarget, L"/now");
 
     RunKeyword(GetParam());
-    std::vector<std::wstring> kept = {L"Broken.lnk", L"Gone.lnk", L"Log.lnk", L"Long.lnk",
-                                      L"Notepad.lnk"};
-    EXPECT_EQ(kept, ListDir(userFolder));
-    EXPECT_FALSE(DirExists(JoinPath(m_commonPrograms, kDefaultFolder)));
-    EXPECT_EQ(std::vector<std::wstring>{kOneClickLink}, ListDir(otherVendor));
-    EXPECT_EQ(std::vector<std::wstring>{L"Notepad.lnk"}, ListDir(m_commonDesktop));
+    EXPECT_EQ((Names{L"Broken.lnk", L"Gone.lnk", L"Log.lnk", L"Long.lnk", L"Notepad.lnk"}),
+              ListDir(folder));
+    EXPECT_FALSE(DirExists(JoinPath(m_programs[1], kDefaultFolder)));
+    EXPECT_EQ(Names{kOneClickLink}, ListDir(otherVendor));
+    EXPECT_EQ(Names{L"Notepad.lnk"}, ListDir(m_commonDesktop));
     EXPECT_TRUE(ListDir(m_userDesktop).empty());
 }
 
 INSTANTIATE_TEST_SUITE_P(Keywords, RemoveShortcutsTest,
                          ::testing::Values(L"delshortcuts", L"delunuseddata"));
 
-// A Start-menu folder of the suite that is a link planted by the user: no
-// shortcut is written through it, and none it leads to is deleted.
+// A suite folder that the user replaced by a link: no shortcut is written
+// through it, and none it leads to is renamed or deleted.
 TEST_F(ShortcutsTest, NoShortcutWorkGoesThroughAPlantedLink) {
     std::wstring elsewhere = m_scratch.Sub(L"elsewhere", true);
     Plant(elsewhere, L"Join.lnk", InRoot(L"qmoneclk.exe"));
-    HostLink planted(JoinPath(m_userPrograms, kDefaultFolder), elsewhere);
+    HostLink planted(JoinPath(m_programs[0], kDefaultFolder), elsewhere);
     ASSERT_TRUE(planted.ok());
     for (const wchar_t* keyword : {L"addshortcuts", L"updateshortcuts", L"delshortcuts"}) {
         RunResult run = RunKeyword(keyword);
-        EXPECT_TRUE(run.HasTraceContaining("refused to go through a reparse point"))
-            << Narrow(keyword);
-        EXPECT_EQ(std::vector<std::wstring>{L"Join.lnk"}, ListDir(elsewhere)) << Narrow(keyword);
+        EXPECT_TRUE(run.HasTraceContaining("refused to go through a reparse point"));
+        EXPECT_EQ(Names{L"Join.lnk"}, ListDir(elsewhere)) << Narrow(keyword);
     }
 }
 

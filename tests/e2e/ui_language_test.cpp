@@ -6,7 +6,6 @@
 #include <windows.h>
 #include <gtest/gtest.h>
 
-#include <memory>
 #include <optional>
 #include <string>
 
@@ -39,7 +38,10 @@ const LanguageCase kCases[] = {
     {"no suite at all", nullptr, nullptr, std::nullopt, 1033},
 };
 
-class UILanguageTest : public MachineTest, public ::testing::WithParamInterface<LanguageCase> {};
+class UILanguageTest : public MachineTest, public ::testing::WithParamInterface<LanguageCase> {
+protected:
+    ~UILanguageTest() override { RemoveProducts(); }
+};
 
 TEST_P(UILanguageTest, ProgramStartsInTheChosenLanguage) {
     const LanguageCase& c = GetParam();
@@ -51,9 +53,8 @@ TEST_P(UILanguageTest, ProgramStartsInTheChosenLanguage) {
         ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, kSuiteKey, L"QMUILanguage", c.machineCode));
     }
     // Filed under a later upgrade code: the earlier ones are tried first.
-    std::unique_ptr<InstalledProduct> product;
     if (c.productLanguage) {
-        product = std::make_unique<InstalledProduct>(2, k64, 0);
+        RegisterProduct(2, k64, 0);
         ASSERT_TRUE(
             RegPutDword(HKEY_LOCAL_MACHINE, kUninstallEntry, L"Language", *c.productLanguage));
     }
@@ -64,9 +65,6 @@ TEST_P(UILanguageTest, ProgramStartsInTheChosenLanguage) {
                                    std::to_string(c.expected) + "\n"));
 }
 
-INSTANTIATE_TEST_SUITE_P(Cases, UILanguageTest, ::testing::ValuesIn(kCases),
-                         [](const ::testing::TestParamInfo<LanguageCase>& info) {
-                             return "Case" + std::to_string(info.index);
-                         });
+INSTANTIATE_TEST_SUITE_P(Cases, UILanguageTest, ::testing::ValuesIn(kCases));
 
 }  // namespace
