@@ -14,6 +14,16 @@ double MeanProcessMilliseconds(const std::wstring& commandLine, int runs, int wa
 // Milliseconds since an arbitrary start, with sub-millisecond resolution.
 double NowMilliseconds();
 
+// Runs commandLine with its input and output on NUL and waits for it; its exit
+// code, or -1 when it could not be started.
+int RunQuietly(const std::wstring& commandLine);
+
+// build/bin, seen from a benchmark in build/bin/bench.
+std::wstring BuildBinDir();
+
+// Creates or replaces the file with exactly these bytes.
+bool WriteWholeFile(const std::wstring& path, const std::string& bytes);
+
 // Measurements of one kind, in milliseconds.
 struct Series {
     const char* name;

@@ -10,14 +10,6 @@
 
 namespace {
 
-std::wstring BinDir() {
-    wchar_t path[MAX_PATH] = {};
-    GetModuleFileNameW(nullptr, path, MAX_PATH);
-    PathRemoveFileSpecW(path);  // bin/bench
-    PathRemoveFileSpecW(path);  // bin
-    return path;
-}
-
 std::wstring Quoted(const std::wstring& path) {
     return L"\"" + path + L"\"";
 }
@@ -29,7 +21,7 @@ int wmain(int argc, wchar_t** argv) {
     if (runs <= 0) {
         runs = 40;
     }
-    std::wstring bin = BinDir();
+    std::wstring bin = BuildBinDir();
     // The program as installed: with its trace library beside it (the
     // stand-in writes nothing without its log variable).
     wchar_t temp[MAX_PATH] = {};
