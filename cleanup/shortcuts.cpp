@@ -81,6 +81,29 @@ bool RunsUnderWow64() {
     return isWow64Process != nullptr && isWow64Process(GetCurrentProcess(), &wow64) && wow64;
 }
 
+// The suite's root folder, when it holds "qmRes.dll" (which the texts and the
+// icons need), and that library's path.
+bool FindRootWithResources(CStringEx& root, CStringEx& resLibrary) {
+    if (!GetShortcutRoot(root)) {
+        return false;
+    }
+    resLibrary = InRoot(root, kResLibrary);
+    return PathFileExistsW(resLibrary.c_str()) != FALSE;
+}
+
+// Runs work(programs, folder) for the suite's folder named folderName in the
+// user's and in the common program folder, where there is one to work in.
+template <typename Work>
+void ForEachSuiteFolder(const ActiveUserFolders& folders, const CStringEx& folderName, Work work) {
+    for (int csidl : kProgramFolders) {
+        CStringEx programs;
+        CStringEx folder;
+        if (folders.Get(csidl, programs) && SuiteFolderIn(programs, folderName, folder)) {
+            work(programs, folder);
+        }
+    }
+}
+
 // The calling account's own shell folder, as a 32-bit process sees it.
 bool OwnSpecialFolder(int csidl, CStringEx& path) {
     wchar_t folder[MAX_PATH] = {};
@@ -95,14 +118,11 @@ bool OwnSpecialFolder(int csidl, CStringEx& path) {
 
 void AddShortcuts() {
     CStringEx root;
+    CStringEx resLibrary;
     CStringEx productCode;
-    if (!GetShortcutRoot(root) ||
+    if (!FindRootWithResources(root, resLibrary) ||
         !GetRegString(HKEY_LOCAL_MACHINE, kSuiteKey, L"ProductCode", productCode, 0) ||
         productCode.IsEmpty()) {
-        return;
-    }
-    const CStringEx resLibrary = InRoot(root, kResLibrary);
-    if (!PathFileExistsW(resLibrary.c_str())) {
         return;
     }
     const SuiteTextLibrary res(root, kResLibrary);
@@ -128,19 +148,14 @@ void AddShortcuts() {
 
     HWND owner = GetActiveWindow();
     const ActiveUserFolders folders;
-    for (int csidl : kProgramFolders) {
-        CStringEx special;
-        CStringEx folder;
-        if (!folders.Get(csidl, special) || !SuiteFolderIn(special, folderName, folder)) {
-            continue;
-        }
+    ForEachSuiteFolder(folders, folderName, [&](const CStringEx&, const CStringEx& folder) {
         if (GetFileAttributesW(folder.c_str()) == INVALID_FILE_ATTRIBUTES) {
             CreateDirectoryW(folder.c_str(), nullptr);
         }
         for (const Shortcut& shortcut : shortcuts) {
             CreateShortcut(owner, folder, shortcut, root);
         }
-    }
+    });
     CStringEx desktop;
     if (!folders.Get(CSIDL_COMMON_DESKTOPDIRECTORY, desktop) ||
         FAILED(CreateShortcut(owner, desktop, oneClickShortcut, root))) {
@@ -153,11 +168,8 @@ void AddShortcuts() {
 
 int UpdateShortcuts() {
     CStringEx root;
-    if (!GetShortcutRoot(root)) {
-        return 0;
-    }
-    const CStringEx resLibrary = InRoot(root, kResLibrary);
-    if (!PathFileExistsW(resLibrary.c_str())) {
+    CStringEx resLibrary;
+    if (!FindRootWithResources(root, resLibrary)) {
         return 0;
     }
     const SuiteTextLibrary res(root, kResLibrary);
@@ -171,24 +183,21 @@ int UpdateShortcuts() {
 
     HWND owner = GetActiveWindow();
     const ActiveUserFolders folders;
-    for (int csidl : kProgramFolders) {
-        CStringEx special;
-        CStringEx oldFolder;
-        if (!folders.Get(csidl, special) || !SuiteFolderIn(special, oldFolderName, oldFolder)) {
-            continue;
-        }
-        UpdateLinkIcon(owner, oldFolder.c_str(), oneClick.c_str(), nullptr, oneClick.c_str(),
-                       kOneClickIcon);
-        UpdateLinkIcon(owner, oldFolder.c_str(), installer.c_str(), kSettingsArguments,
-                       resLibrary.c_str(), kSettingsIcon);
-        RenameLinks(owner, oldFolder, oneClick, nullptr, oneClickName);
-        RenameLinks(owner, oldFolder, installer, kSettingsArguments, settingsName);
-        CStringEx newFolder;
-        if (oldFolderName.CompareNoCase(newFolderName.c_str()) != 0 &&
-            !IsFolderEmpty(oldFolder.c_str()) && SuiteFolderIn(special, newFolderName, newFolder)) {
-            MoveLinkTargetIcon(owner, oldFolder.c_str(), newFolder.c_str(), nullptr);
-        }
-    }
+    ForEachSuiteFolder(
+        folders, oldFolderName, [&](const CStringEx& programs, const CStringEx& oldFolder) {
+            UpdateLinkIcon(owner, oldFolder.c_str(), oneClick.c_str(), nullptr, oneClick.c_str(),
+                           kOneClickIcon);
+            UpdateLinkIcon(owner, oldFolder.c_str(), installer.c_str(), kSettingsArguments,
+                           resLibrary.c_str(), kSettingsIcon);
+            RenameLinks(owner, oldFolder, oneClick, nullptr, oneClickName);
+            RenameLinks(owner, oldFolder, installer, kSettingsArguments, settingsName);
+            CStringEx newFolder;
+            if (oldFolderName.CompareNoCase(newFolderName.c_str()) != 0 &&
+                !IsFolderEmpty(oldFolder.c_str()) &&
+                SuiteFolderIn(programs, newFolderName, newFolder)) {
+                MoveLinkTargetIcon(owner, oldFolder.c_str(), newFolder.c_str(), nullptr);
+            }
+        });
     int desktopResult = 0;
     for (int csidl : kDesktops) {
         CStringEx desktop;
@@ -254,17 +263,12 @@ void UnInstallShortcuts() {
 
     HWND owner = GetActiveWindow();
     const ActiveUserFolders folders;
-    for (int csidl : kProgramFolders) {
-        CStringEx special;
-        CStringEx folder;
-        if (!folders.Get(csidl, special) || !SuiteFolderIn(special, folderName, folder)) {
-            continue;
-        }
+    ForEachSuiteFolder(folders, folderName, [&](const CStringEx&, const CStringEx& folder) {
         DeleteLinksByTargets(owner, folder.c_str(), rules, sizeof(rules) / sizeof(rules[0]));
         if (IsFolderEmpty(folder.c_str())) {
             RemoveDirectoryW(folder.c_str());
         }
-    }
+    });
     for (int csidl : kDesktops) {
         CStringEx desktop;
         if (folders.Get(csidl, desktop)) {
