@@ -133,6 +133,8 @@ ServiceStandIn::ServiceStandIn(const std::wstring& folder, ProgramUnderTest* pro
 ServiceStandIn::~ServiceStandIn() {
     WaitForServersToEnd();
     RunStandIn(L"-UnregServer");
+    DeleteFileW(m_script.c_str());
+    DeleteFileW(m_log.c_str());
     SetEnvironmentVariableW(L"QM_FAKE_QMSRV_SCRIPT", nullptr);
     SetEnvironmentVariableW(L"QM_FAKE_QMSRV_LOG", nullptr);
 }

@@ -8,6 +8,7 @@
 #include <objbase.h>
 #include <shlwapi.h>
 
+#include <cstdio>
 #include <string>
 
 #include "tests/fakes/qmsrv/service_objects.h"
@@ -83,7 +84,9 @@ public:
         object->AddRef();
         HRESULT hr = object->QueryInterface(riid, out);
         object->Release();
-        fake::LogEntry("create", Object::kName, {});
+        char when[32];
+        snprintf(when, sizeof(when), "%.3f", fake::CounterMs());
+        fake::LogEntry("create", Object::kName, {{false, when}});
         return hr;
     }
     STDMETHODIMP LockServer(BOOL lock) override {

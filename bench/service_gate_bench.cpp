@@ -1,0 +1,118 @@
+// The Suite service gate against the stand-in service (out of process):
+//   - event to exit: from the service raising the ending event (DISPID 96) to
+//     the end of qmMrvONI.exe (goal: median under 50 ms);
+//   - start to first call: from starting qmMrvONI.exe to the first method
+//     call reaching the service, with the service started by the activation
+//     (cold) and already running (warm);
+// each over 20 runs, against the start-to-exit time of an empty program.
+#include <windows.h>
+#include <shlwapi.h>
+
+#include <cstdio>
+#include <string>
+
+#include "actions/suite_service_com.h"
+#include "base/com_owners.h"
+#include "bench/process_timing.h"
+#include "tests/support/service_stand_in.h"
+
+namespace {
+
+std::wstring BinDir() {
+    wchar_t path[MAX_PATH] = {};
+    GetModuleFileNameW(nullptr, path, MAX_PATH);
+    PathRemoveFileSpecW(path);  // bin/bench
+    PathRemoveFileSpecW(path);  // bin
+    return path;
+}
+
+double RunToExit(const std::wstring& commandLine) {
+    std::wstring line = commandLine;
+    STARTUPINFOW startup = {};
+    startup.cb = sizeof(startup);
+    PROCESS_INFORMATION process = {};
+    if (!CreateProcessW(nullptr, &line[0], nullptr, nullptr, FALSE, 0, nullptr, nullptr, &startup,
+                        &process)) {
+        return -1;
+    }
+    WaitForSingleObject(process.hProcess, INFINITE);
+    double end = NowMilliseconds();
+    CloseHandle(process.hThread);
+    CloseHandle(process.hProcess);
+    return end;
+}
+
+void Measure(ServiceStandIn& service, const std::wstring& commandLine, int runs, bool cold,
+             Series& firstCall, Series& eventToExit) {
+    for (int i = 0; i < runs; ++i) {
+        service.SetScript("Event=StartOCMeeting Meeting 96 300 1\n");
+        if (cold) {
+            ServiceStandIn::WaitForServersToEnd();
+        }
+        double start = NowMilliseconds();
+        double end = RunToExit(commandLine);
+        double call = service.TimeOf("call", "HasValidAccount");
+        double event = service.TimeOf("event", "Meeting.96");
+        if (end < 0 || call < 0 || event < 0) {
+            printf("  run %d: no call or event reached the service\n", i);
+            continue;
+        }
+        firstCall.ms.push_back(call - start);
+        eventToExit.ms.push_back(end - event);
+    }
+}
+
+}  // namespace
+
+int wmain(int argc, wchar_t** argv) {
+    int runs = argc > 1 ? _wtoi(argv[1]) : 20;
+    if (runs <= 0) {
+        runs = 20;
+    }
+    std::wstring bin = BinDir();
+    wchar_t temp[MAX_PATH] = {};
+    GetTempPathW(MAX_PATH, temp);
+    std::wstring folder = std::wstring(temp) + L"qm-service-bench";
+    CreateDirectoryW(folder.c_str(), nullptr);
+    std::wstring program = folder + L"\\qmMrvONI.exe";
+    CopyFileW((bin + L"\\qmMrvONI.exe").c_str(), program.c_str(), FALSE);
+    CopyFileW((bin + L"\\fakes\\mrvtrace.dll").c_str(), (folder + L"\\mrvtrace.dll").c_str(),
+              FALSE);
+    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);
+    std::wstring commandLine =
+        L"\"" + program + L"\" <CmdLine><Action>StartOCMeeting</Action><hWnd>1</hWnd></CmdLine>";
+
+    double emptyMs =
+        MeanProcessMilliseconds(L"\"" + bin + L"\\bench\\empty_program.exe\" -nosuchkeyword", runs);
+    Series coldCall{"cold start to first call", {}}, coldExit{"cold event to exit", {}};
+    Series warmCall{"warm start to first call", {}}, warmExit{"warm event to exit", {}};
+    {
+        ServiceStandIn service(folder + L"\\service");
+        Measure(service, commandLine, runs, true, coldCall, coldExit);
+        // Holding one object keeps the service running between the runs.
+        CoInitialize(nullptr);
+        {
+            ComPtr<IUnknown> hold;
+            CoCreateInstance(CLSID_Meeting, nullptr, CLSCTX_LOCAL_SERVER, IID_IUnknown,
+                             reinterpret_cast<void**>(hold.GetAddressOf()));
+            Measure(service, commandLine, runs, false, warmCall, warmExit);
+        }
+        CoUninitialize();
+    }
+
+    printf("Suite service gate, medians of %d runs (ms)\n", runs);
+    printf("  empty program, start to exit (baseline)  %8.2f\n", emptyMs);
+    for (Series* series : {&coldCall, &coldExit, &warmCall, &warmExit}) {
+        printf("  %-40s %8.2f  (%.2f x baseline)\n", series->name, series->Median(),
+               series->Median() / emptyMs);
+    }
+    double goal = warmExit.Median() > coldExit.Median() ? warmExit.Median() : coldExit.Median();
+    printf("event to exit under 50 ms: %s\n",
+           !warmExit.ms.empty() && goal < 50 ? "MET" : "NOT MET");
+
+    DeleteFileW(program.c_str());
+    DeleteFileW((folder + L"\\mrvtrace.dll").c_str());
+    RemoveDirectoryW((folder + L"\\service").c_str());
+    RemoveDirectoryW(folder.c_str());
+    return 0;
+}
