@@ -14,7 +14,7 @@
 #include "actions/suite_service_com.h"
 #include "base/com_owners.h"
 #include "bench/process_timing.h"
-#include "tests/support/service_stand_in.h"
+#include "tests/fakes/qmsrv/stand_in_control.h"
 
 namespace {
 
@@ -87,7 +87,7 @@ int wmain(int argc, wchar_t** argv) {
     Series coldCall{"cold start to first call", {}}, coldExit{"cold event to exit", {}};
     Series warmCall{"warm start to first call", {}}, warmExit{"warm event to exit", {}};
     {
-        ServiceStandIn service(folder + L"\\service");
+        ServiceStandIn service(bin + L"\\fakes\\qmSrv.exe", folder + L"\\service");
         Measure(service, commandLine, runs, true, coldCall, coldExit);
         // Holding one object keeps the service running between the runs.
         CoInitialize(nullptr);

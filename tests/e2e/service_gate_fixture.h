@@ -8,33 +8,35 @@
 #include <string>
 #include <vector>
 
+#include "tests/fakes/qmsrv/fake_script.h"
+#include "tests/fakes/qmsrv/stand_in_control.h"
 #include "tests/support/program_run.h"
 #include "tests/support/scratch_dir.h"
-#include "tests/support/service_stand_in.h"
+#include "tests/support/test_paths.h"
 
 class ServiceGateTest : public ::testing::Test {
 protected:
-    ServiceGateTest()
-        : m_program(m_scratch.Sub(L"bin")), m_service(m_scratch.Sub(L"service"), &m_program) {}
-
-    void SetUp() override { ASSERT_TRUE(m_service.registered()); }
-
-    // Runs the command line; m_startMs and m_endMs bracket the process.
-    RunResult Run(const std::wstring& commandLine, DWORD timeoutMs = 60000) {
-        m_startMs = CounterMs();
-        RunResult run = m_program.Run(commandLine, timeoutMs);
-        m_endMs = CounterMs();
-        ServiceStandIn::WaitForServersToEnd();
-        return run;
+    void SetUp() override {
+        ASSERT_TRUE(m_service.registered());
+        m_program.SetEnv(L"QM_FAKE_QMSRV_SCRIPT", m_service.scriptPath());
+        m_program.SetEnv(L"QM_FAKE_QMSRV_LOG", m_service.logPath());
     }
 
-    static void ExpectCleanExit(const RunResult& run) {
+    // Runs the command line with the script; m_endMs is when it ended.
+    RunResult Run(const std::string& script, const std::wstring& commandLine,
+                  DWORD timeoutMs = 60000) {
+        m_service.SetScript(script);
+        m_startMs = fake::CounterMs();
+        RunResult run = m_program.Run(commandLine, timeoutMs);
+        m_endMs = fake::CounterMs();
+        ServiceStandIn::WaitForServersToEnd();
         EXPECT_FALSE(run.crashed);
         EXPECT_FALSE(run.timedOut);
         EXPECT_EQ(0, run.exitCode);
+        return run;
     }
 
-    // The text of the only call of method (empty when not exactly one).
+    // The document of the only call of method.
     std::string OnlyDocument(const std::string& method) const {
         std::vector<ServiceEntry> calls = m_service.Calls(method);
         EXPECT_EQ(1u, calls.size()) << method;
@@ -42,8 +44,8 @@ protected:
     }
 
     ScratchDir m_scratch{L"gate"};
-    ProgramUnderTest m_program;
-    ServiceStandIn m_service;
+    ProgramUnderTest m_program{m_scratch.Sub(L"bin")};
+    ServiceStandIn m_service{FakePath(L"qmSrv.exe"), m_scratch.Sub(L"service", true)};
     double m_startMs = 0;
     double m_endMs = 0;
 };

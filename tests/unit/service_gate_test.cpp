@@ -8,8 +8,9 @@
 #include <functional>
 
 #include "actions/service_gate.h"
+#include "tests/fakes/qmsrv/stand_in_control.h"
 #include "tests/support/scratch_dir.h"
-#include "tests/support/service_stand_in.h"
+#include "tests/support/test_paths.h"
 
 namespace {
 
@@ -20,7 +21,7 @@ protected:
     void SetUp() override { ASSERT_TRUE(m_service.registered()); }
 
     ScratchDir m_scratch{L"gateunit"};
-    ServiceStandIn m_service{m_scratch.Sub(L"service")};
+    ServiceStandIn m_service{FakePath(L"qmSrv.exe"), m_scratch.Sub(L"service", true)};
 };
 
 // Runs a callback for every event it receives.

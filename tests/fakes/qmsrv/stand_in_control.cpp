@@ -1,11 +1,10 @@
-#include "tests/support/service_stand_in.h"
+#include "tests/fakes/qmsrv/stand_in_control.h"
 
 #include <tlhelp32.h>
 
 #include <cstdlib>
 
-#include "tests/support/file_util.h"
-#include "tests/support/test_paths.h"
+#include "tests/fakes/qmsrv/fake_script.h"
 
 std::vector<ServiceEntry> ParseServiceLog(const std::string& bytes) {
     std::vector<ServiceEntry> entries;
@@ -45,15 +44,8 @@ std::vector<ServiceEntry> ParseServiceLog(const std::string& bytes) {
     return entries;
 }
 
-double CounterMs() {
-    LARGE_INTEGER now, frequency;
-    QueryPerformanceCounter(&now);
-    QueryPerformanceFrequency(&frequency);
-    return static_cast<double>(now.QuadPart) * 1000.0 / static_cast<double>(frequency.QuadPart);
-}
-
-bool ServiceStandIn::RunStandIn(const wchar_t* argument) {
-    std::wstring line = L"\"" + FakePath(L"qmSrv.exe") + L"\" " + argument;
+bool ServiceStandIn::Run(const wchar_t* argument) {
+    std::wstring line = L"\"" + m_exe + L"\" " + argument;
     STARTUPINFOW startup = {};
     startup.cb = sizeof(startup);
     PROCESS_INFORMATION process = {};
@@ -116,36 +108,31 @@ void ServiceStandIn::WaitForServersToEnd(DWORD timeoutMs) {
     }
 }
 
-ServiceStandIn::ServiceStandIn(const std::wstring& folder, ProgramUnderTest* program)
-    : m_script(JoinPath(folder, L"qmsrv-script.txt")), m_log(JoinPath(folder, L"qmsrv.log")) {
-    MakeDirs(folder);
-    WriteFileBytes(m_script, "");
-    m_registered = RunStandIn(L"-RegServer");
-    if (program != nullptr) {
-        program->SetEnv(L"QM_FAKE_QMSRV_SCRIPT", m_script);
-        program->SetEnv(L"QM_FAKE_QMSRV_LOG", m_log);
-    }
-    // For a server started by this process.
+ServiceStandIn::ServiceStandIn(const std::wstring& standInExe, const std::wstring& folder)
+    : m_exe(standInExe), m_script(folder + L"\\qmsrv-script.txt"), m_log(folder + L"\\qmsrv.log") {
+    CreateDirectoryW(folder.c_str(), nullptr);
+    SetScript("");
+    m_registered = Register();
     SetEnvironmentVariableW(L"QM_FAKE_QMSRV_SCRIPT", m_script.c_str());
     SetEnvironmentVariableW(L"QM_FAKE_QMSRV_LOG", m_log.c_str());
 }
 
 ServiceStandIn::~ServiceStandIn() {
     WaitForServersToEnd();
-    RunStandIn(L"-UnregServer");
-    DeleteFileW(m_script.c_str());
-    DeleteFileW(m_log.c_str());
+    Unregister();
     SetEnvironmentVariableW(L"QM_FAKE_QMSRV_SCRIPT", nullptr);
     SetEnvironmentVariableW(L"QM_FAKE_QMSRV_LOG", nullptr);
+    DeleteFileW(m_script.c_str());
+    DeleteFileW(m_log.c_str());
 }
 
 void ServiceStandIn::SetScript(const std::string& text) {
-    WriteFileBytes(m_script, text);
+    fake::WriteWholeFile(m_script, text);
     DeleteFileW(m_log.c_str());
 }
 
 std::vector<ServiceEntry> ServiceStandIn::Log() const {
-    return ParseServiceLog(ReadFileBytes(m_log));
+    return ParseServiceLog(fake::ReadWholeFile(m_log));
 }
 
 std::vector<ServiceEntry> ServiceStandIn::Calls(const std::string& method) const {

@@ -1,8 +1,7 @@
-// The stand-in Suite service (build/bin/fakes/qmSrv.exe) registered in the
-// test's prefix as an out-of-process COM server for the lifetime of this
-// object, scripted through a scratch file, with the log of what it received.
-// Servers still running at the end are waited for (then ended) and the
-// registration is removed.
+// How a test or benchmark drives the stand-in Suite service: registers it in
+// the prefix as an out-of-process COM server for the lifetime of this object,
+// writes its script, reads its log. Servers still running at the end are
+// waited for (then ended) and the registration is removed.
 #pragma once
 
 #include <windows.h>
@@ -10,10 +9,8 @@
 #include <string>
 #include <vector>
 
-#include "tests/support/program_run.h"
-
 // One entry of the stand-in's log: kind "call", "event", "advise",
-// "unadvise", "create" or "server"; a call's last argument is the time.
+// "unadvise", "create" or "server"; a call's last argument is its time.
 struct ServiceEntry {
     std::string kind;
     std::string name;
@@ -24,13 +21,20 @@ std::vector<ServiceEntry> ParseServiceLog(const std::string& bytes);
 
 class ServiceStandIn {
 public:
-    // Scratch files go to folder; the program gets the variables that name them.
-    ServiceStandIn(const std::wstring& folder, ProgramUnderTest* program = nullptr);
+    // standInExe: qmSrv.exe (its type library beside it); the script and log
+    // go to folder, and this process's environment names them, for a server
+    // it starts. Set the same variables for programs started otherwise.
+    ServiceStandIn(const std::wstring& standInExe, const std::wstring& folder);
     ~ServiceStandIn();
     ServiceStandIn(const ServiceStandIn&) = delete;
     ServiceStandIn& operator=(const ServiceStandIn&) = delete;
 
     bool registered() const { return m_registered; }
+    const std::wstring& scriptPath() const { return m_script; }
+    const std::wstring& logPath() const { return m_log; }
+    bool Register() { return Run(L"-RegServer"); }
+    bool Unregister() { return Run(L"-UnregServer"); }
+
     // Replaces the script and empties the log.
     void SetScript(const std::string& text);
     std::vector<ServiceEntry> Log() const;
@@ -42,13 +46,12 @@ public:
 
     // Waits until no stand-in server runs any more (ends them after timeoutMs).
     static void WaitForServersToEnd(DWORD timeoutMs = 10000);
-    static bool RunStandIn(const wchar_t* argument);
 
 private:
+    bool Run(const wchar_t* argument);
+
+    std::wstring m_exe;
     std::wstring m_script;
     std::wstring m_log;
     bool m_registered = false;
 };
-
-// Performance counter in ms, comparable with the stand-in's times.
-double CounterMs();
