@@ -5,7 +5,6 @@
 #include <string>
 
 #include "base/com_error_text.h"
-#include "base/connection_point.h"
 #include "base/trace.h"
 
 CComWrapBase::CComWrapBase(const CLSID& objectClass, const IID& objectInterface, const IID& events)
@@ -43,14 +42,32 @@ HRESULT CComWrapBase::Connect(AdvisedSink& entry) {
     if (entry.cookie != 0) {
         return S_OK;
     }
-    return AdviseSink(m_object.Get(), m_events, entry.sink, &entry.cookie);
+    if (!m_point) {
+        HRESULT hr = FindConnectionPointOf(m_object.Get(), m_events, m_point);
+        if (FAILED(hr)) {
+            return hr;
+        }
+    }
+    HRESULT hr = m_point->Advise(entry.sink, &entry.cookie);
+    if (FAILED(hr)) {
+        entry.cookie = 0;
+    }
+    return hr;
 }
 
 void CComWrapBase::Disconnect(AdvisedSink& entry) {
-    if (entry.cookie != 0 && m_object) {
-        UnadviseSink(m_object.Get(), m_events, entry.cookie);
+    if (entry.cookie != 0 && m_point) {
+        m_point->Unadvise(entry.cookie);
     }
     entry.cookie = 0;
+}
+
+void CComWrapBase::ReleaseObject() {
+    for (AdvisedSink& entry : m_sinks) {
+        Disconnect(entry);
+    }
+    m_point.Reset();
+    m_object.Reset();
 }
 
 HRESULT CComWrapBase::Advise(DispatchEventSink* sink) {
@@ -73,18 +90,12 @@ void CComWrapBase::Unadvise(DispatchEventSink* sink) {
 }
 
 void CComWrapBase::ReleaseInstance() {
-    for (AdvisedSink& entry : m_sinks) {
-        Disconnect(entry);
-    }
+    ReleaseObject();
     m_sinks.clear();
-    m_object.Reset();
 }
 
 void CComWrapBase::ReCreateInstance() {
-    for (AdvisedSink& entry : m_sinks) {
-        Disconnect(entry);
-    }
-    m_object.Reset();
+    ReleaseObject();
     HRESULT hr = CoCreateInstance(m_class, nullptr, CLSCTX_ALL, m_interface,
                                   reinterpret_cast<void**>(m_object.GetAddressOf()));
     if (FAILED(hr) || !m_object) {

@@ -15,6 +15,7 @@
 #include <vector>
 
 #include "base/com_owners.h"
+#include "base/connection_point.h"
 #include "base/dispatch_event_sink.h"
 
 // The wrappers' own sink: connected while the object exists, reacts to nothing.
@@ -89,6 +90,7 @@ private:
 
     HRESULT Connect(AdvisedSink& entry);
     void Disconnect(AdvisedSink& entry);
+    void ReleaseObject();
     void ReCreateInstance();
     static void ReportComError(const char* operation, HRESULT hr);
     static void ReportOtherFailure(const char* operation);
@@ -99,6 +101,7 @@ private:
     bool m_autoAdvise = true;
     std::vector<AdvisedSink> m_sinks;
     ComPtr<IDispatch> m_object;
+    ComPtr<IConnectionPoint> m_point;  // of m_object, found on the first advise
     bool m_busy = false;
     CEmptyEventSink m_ownSink;
 };

@@ -1,13 +1,13 @@
-// Advising and unadvising an event sink on a COM object's connection point,
-// the connection named by the cookie that Advise hands out.
+// The connection point through which a COM object raises one event
+// interface. Find it once per object, then Advise a sink (which hands out the
+// connection's cookie) and Unadvise that cookie on the same point.
 #pragma once
 
 #include <windows.h>
-#include <objbase.h>
+#include <ocidl.h>
 
-// Connects sink to source's connection point for the event interface
-// `events`; *cookie receives the connection's cookie (0 on failure).
-HRESULT AdviseSink(IUnknown* source, const IID& events, IUnknown* sink, DWORD* cookie);
+#include "base/com_owners.h"
 
-// Ends the connection `cookie` of source's connection point for `events`.
-HRESULT UnadviseSink(IUnknown* source, const IID& events, DWORD cookie);
+// source's connection point for the event interface `events`; point stays
+// empty on failure.
+HRESULT FindConnectionPointOf(IUnknown* source, const IID& events, ComPtr<IConnectionPoint>& point);

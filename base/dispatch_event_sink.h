@@ -10,7 +10,8 @@
 //   protected:
 //       HRESULT OnInvoke(DISPID id, const DISPPARAMS& params) override { ... }
 //   };
-//   AdviseSink(source, DIID_MyEvents, &sink, &cookie);  ...  UnadviseSink(..., cookie);
+//   FindConnectionPointOf(source, DIID_MyEvents, point);   // base/connection_point.h
+//   point->Advise(&sink, &cookie);  ...  point->Unadvise(cookie);
 #pragma once
 
 #include <windows.h>

@@ -1,5 +1,7 @@
 #include "bench/process_timing.h"
 
+#include <shlwapi.h>
+
 #include <vector>
 
 namespace {
@@ -37,4 +39,31 @@ double MeanProcessMilliseconds(const std::wstring& commandLine, int runs, int wa
         RunOnce(commandLine);
     }
     return (NowMilliseconds() - start) / runs;
+}
+
+std::wstring BenchBinDir() {
+    wchar_t path[MAX_PATH] = {};
+    GetModuleFileNameW(nullptr, path, MAX_PATH);
+    PathRemoveFileSpecW(path);  // bin/bench
+    PathRemoveFileSpecW(path);  // bin
+    return path;
+}
+
+ProgramCopy::ProgramCopy(const wchar_t* folderName) {
+    wchar_t temp[MAX_PATH] = {};
+    GetTempPathW(MAX_PATH, temp);
+    m_folder = std::wstring(temp) + folderName;
+    m_program = m_folder + L"\\qmMrvONI.exe";
+    CreateDirectoryW(m_folder.c_str(), nullptr);
+    std::wstring bin = BenchBinDir();
+    CopyFileW((bin + L"\\qmMrvONI.exe").c_str(), m_program.c_str(), FALSE);
+    CopyFileW((bin + L"\\fakes\\mrvtrace.dll").c_str(), (m_folder + L"\\mrvtrace.dll").c_str(),
+              FALSE);
+    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);
+}
+
+ProgramCopy::~ProgramCopy() {
+    DeleteFileW(m_program.c_str());
+    DeleteFileW((m_folder + L"\\mrvtrace.dll").c_str());
+    RemoveDirectoryW(m_folder.c_str());
 }

@@ -6,7 +6,6 @@
 //     (cold) and already running (warm);
 // each over 20 runs, against the start-to-exit time of an empty program.
 #include <windows.h>
-#include <shlwapi.h>
 
 #include <cstdio>
 #include <string>
@@ -17,14 +16,6 @@
 #include "tests/fakes/qmsrv/stand_in_control.h"
 
 namespace {
-
-std::wstring BinDir() {
-    wchar_t path[MAX_PATH] = {};
-    GetModuleFileNameW(nullptr, path, MAX_PATH);
-    PathRemoveFileSpecW(path);  // bin/bench
-    PathRemoveFileSpecW(path);  // bin
-    return path;
-}
 
 double RunToExit(const std::wstring& commandLine) {
     std::wstring line = commandLine;
@@ -69,25 +60,17 @@ int wmain(int argc, wchar_t** argv) {
     if (runs <= 0) {
         runs = 20;
     }
-    std::wstring bin = BinDir();
-    wchar_t temp[MAX_PATH] = {};
-    GetTempPathW(MAX_PATH, temp);
-    std::wstring folder = std::wstring(temp) + L"qm-service-bench";
-    CreateDirectoryW(folder.c_str(), nullptr);
-    std::wstring program = folder + L"\\qmMrvONI.exe";
-    CopyFileW((bin + L"\\qmMrvONI.exe").c_str(), program.c_str(), FALSE);
-    CopyFileW((bin + L"\\fakes\\mrvtrace.dll").c_str(), (folder + L"\\mrvtrace.dll").c_str(),
-              FALSE);
-    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);
+    std::wstring bin = BenchBinDir();
+    ProgramCopy program(L"qm-service-bench");
     std::wstring commandLine =
-        L"\"" + program + L"\" <CmdLine><Action>StartOCMeeting</Action><hWnd>1</hWnd></CmdLine>";
+        program.Quoted() + L" <CmdLine><Action>StartOCMeeting</Action><hWnd>1</hWnd></CmdLine>";
 
     double emptyMs =
         MeanProcessMilliseconds(L"\"" + bin + L"\\bench\\empty_program.exe\" -nosuchkeyword", runs);
     Series coldCall{"cold start to first call", {}}, coldExit{"cold event to exit", {}};
     Series warmCall{"warm start to first call", {}}, warmExit{"warm event to exit", {}};
     {
-        ServiceStandIn service(bin + L"\\fakes\\qmSrv.exe", folder + L"\\service");
+        ServiceStandIn service(bin + L"\\fakes\\qmSrv.exe", program.folder() + L"\\service");
         Measure(service, commandLine, runs, true, coldCall, coldExit);
         // Holding one object keeps the service running between the runs.
         CoInitialize(nullptr);
@@ -110,9 +93,6 @@ int wmain(int argc, wchar_t** argv) {
     printf("event to exit under 50 ms: %s\n",
            !warmExit.ms.empty() && goal < 50 ? "MET" : "NOT MET");
 
-    DeleteFileW(program.c_str());
-    DeleteFileW((folder + L"\\mrvtrace.dll").c_str());
-    RemoveDirectoryW((folder + L"\\service").c_str());
-    RemoveDirectoryW(folder.c_str());
+    RemoveDirectoryW((program.folder() + L"\\service").c_str());
     return 0;
 }

@@ -1,7 +1,6 @@
 // Start-to-exit time of "qmMrvONI.exe -nosuchkeyword" against a minimal
 // Windows program and against a program that only initialises COM.
 #include <windows.h>
-#include <shlwapi.h>
 
 #include <cstdio>
 #include <string>
@@ -9,14 +8,6 @@
 #include "bench/process_timing.h"
 
 namespace {
-
-std::wstring BinDir() {
-    wchar_t path[MAX_PATH] = {};
-    GetModuleFileNameW(nullptr, path, MAX_PATH);
-    PathRemoveFileSpecW(path);  // bin/bench
-    PathRemoveFileSpecW(path);  // bin
-    return path;
-}
 
 std::wstring Quoted(const std::wstring& path) {
     return L"\"" + path + L"\"";
@@ -29,22 +20,12 @@ int wmain(int argc, wchar_t** argv) {
     if (runs <= 0) {
         runs = 40;
     }
-    std::wstring bin = BinDir();
-    // The program as installed: with its trace library beside it (the
-    // stand-in writes nothing without its log variable).
-    wchar_t temp[MAX_PATH] = {};
-    GetTempPathW(MAX_PATH, temp);
-    std::wstring folder = std::wstring(temp) + L"qm-startup-bench";
-    CreateDirectoryW(folder.c_str(), nullptr);
-    std::wstring program = folder + L"\\qmMrvONI.exe";
-    CopyFileW((bin + L"\\qmMrvONI.exe").c_str(), program.c_str(), FALSE);
-    CopyFileW((bin + L"\\fakes\\mrvtrace.dll").c_str(), (folder + L"\\mrvtrace.dll").c_str(),
-              FALSE);
-    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);
+    std::wstring bin = BenchBinDir();
+    ProgramCopy program(L"qm-startup-bench");
 
     std::wstring empty = Quoted(bin + L"\\bench\\empty_program.exe") + L" -nosuchkeyword";
     std::wstring floor = Quoted(bin + L"\\bench\\com_floor_program.exe") + L" -nosuchkeyword";
-    std::wstring ours = Quoted(program) + L" -nosuchkeyword";
+    std::wstring ours = program.Quoted() + L" -nosuchkeyword";
 
     // Interleave rounds so drift of the machine hits all three alike.
     double emptyMs = 0, floorMs = 0, oursMs = 0;
@@ -65,9 +46,5 @@ int wmain(int argc, wchar_t** argv) {
     printf("ratio qmMrvONI / empty program:  %.2f (goal: at most 1.20) %s\n", oursMs / emptyMs,
            oursMs / emptyMs <= 1.2 ? "MET" : "NOT MET");
     printf("ratio qmMrvONI / COM-only:       %.2f\n", oursMs / floorMs);
-
-    DeleteFileW(program.c_str());
-    DeleteFileW((folder + L"\\mrvtrace.dll").c_str());
-    RemoveDirectoryW(folder.c_str());
     return 0;
 }

@@ -5,6 +5,7 @@
 #include <sstream>
 
 #include "tests/fakes/common/fake_recorder.h"
+#include "tests/support/file_util.h"
 
 namespace fake {
 
@@ -40,34 +41,6 @@ void AddLine(Script& script, const std::string& key, const std::string& value) {
 
 }  // namespace
 
-std::string ReadWholeFile(const std::wstring& path) {
-    std::string bytes;
-    HANDLE file = CreateFileW(path.c_str(), GENERIC_READ, FILE_SHARE_READ, nullptr, OPEN_EXISTING,
-                              0, nullptr);
-    if (file == INVALID_HANDLE_VALUE) {
-        return bytes;
-    }
-    char buffer[4096];
-    DWORD got = 0;
-    while (ReadFile(file, buffer, sizeof(buffer), &got, nullptr) && got > 0) {
-        bytes.append(buffer, got);
-    }
-    CloseHandle(file);
-    return bytes;
-}
-
-bool WriteWholeFile(const std::wstring& path, const std::string& bytes) {
-    HANDLE file = CreateFileW(path.c_str(), GENERIC_WRITE, FILE_SHARE_READ, nullptr, CREATE_ALWAYS,
-                              0, nullptr);
-    if (file == INVALID_HANDLE_VALUE) {
-        return false;
-    }
-    DWORD written = 0;
-    BOOL ok = WriteFile(file, bytes.data(), static_cast<DWORD>(bytes.size()), &written, nullptr);
-    CloseHandle(file);
-    return ok && written == bytes.size();
-}
-
 std::string Script::Value(const std::string& key, const std::string& fallback) const {
     auto found = values.find(key);
     return found == values.end() ? fallback : found->second;
@@ -81,7 +54,7 @@ long Script::Number(const std::string& key, long fallback) const {
 
 Script LoadScript() {
     Script script;
-    std::istringstream lines(ReadWholeFile(EnvironmentValue(L"QM_FAKE_QMSRV_SCRIPT")));
+    std::istringstream lines(ReadFileBytes(EnvironmentValue(L"QM_FAKE_QMSRV_SCRIPT")));
     std::string line;
     while (std::getline(lines, line)) {
         if (!line.empty() && line.back() == '\r') {
@@ -105,28 +78,7 @@ void LogEntry(const std::string& kind, const std::string& name, const std::vecto
 }
 
 LogArg Utf8Arg(const wchar_t* text) {
-    LogArg arg;
-    if (text == nullptr) {
-        arg.isNull = true;
-        return arg;
-    }
-    int size = WideCharToMultiByte(CP_UTF8, 0, text, -1, nullptr, 0, nullptr, nullptr);
-    if (size > 1) {
-        arg.text.resize(size - 1);
-        WideCharToMultiByte(CP_UTF8, 0, text, -1, &arg.text[0], size, nullptr, nullptr);
-    }
-    return arg;
-}
-
-std::wstring Widen(const std::string& utf8) {
-    if (utf8.empty()) {
-        return std::wstring();
-    }
-    int size =
-        MultiByteToWideChar(CP_UTF8, 0, utf8.data(), static_cast<int>(utf8.size()), nullptr, 0);
-    std::wstring wide(size, L'\0');
-    MultiByteToWideChar(CP_UTF8, 0, utf8.data(), static_cast<int>(utf8.size()), &wide[0], size);
-    return wide;
+    return text == nullptr ? LogArg{true, ""} : LogArg{false, Narrow(text)};
 }
 
 double CounterMs() {
@@ -134,6 +86,12 @@ double CounterMs() {
     QueryPerformanceCounter(&now);
     QueryPerformanceFrequency(&frequency);
     return static_cast<double>(now.QuadPart) * 1000.0 / static_cast<double>(frequency.QuadPart);
+}
+
+LogArg CounterMsArg() {
+    char text[32];
+    snprintf(text, sizeof(text), "%.3f", CounterMs());
+    return LogArg{false, text};
 }
 
 }  // namespace fake

@@ -57,10 +57,9 @@ struct LogArg {
 };
 void LogEntry(const std::string& kind, const std::string& name, const std::vector<LogArg>& args);
 LogArg Utf8Arg(const wchar_t* text);  // null stays null
-std::wstring Widen(const std::string& utf8);
-std::string ReadWholeFile(const std::wstring& path);
-bool WriteWholeFile(const std::wstring& path, const std::string& bytes);
-// Milliseconds of the performance counter, comparable across processes.
+// Milliseconds of the performance counter, comparable across processes,
+// and the same as a log argument.
 double CounterMs();
+LogArg CounterMsArg();
 
 }  // namespace fake

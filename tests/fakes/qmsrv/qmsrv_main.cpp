@@ -8,7 +8,6 @@
 #include <objbase.h>
 #include <shlwapi.h>
 
-#include <cstdio>
 #include <string>
 
 #include "tests/fakes/qmsrv/service_objects.h"
@@ -84,9 +83,7 @@ public:
         object->AddRef();
         HRESULT hr = object->QueryInterface(riid, out);
         object->Release();
-        char when[32];
-        snprintf(when, sizeof(when), "%.3f", fake::CounterMs());
-        fake::LogEntry("create", Object::kName, {{false, when}});
+        fake::LogEntry("create", Object::kName, {fake::CounterMsArg()});
         return hr;
     }
     STDMETHODIMP LockServer(BOOL lock) override {

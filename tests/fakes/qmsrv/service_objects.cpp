@@ -2,6 +2,8 @@
 
 #include <cstdio>
 
+#include "tests/support/file_util.h"
+
 namespace fake {
 
 namespace {
@@ -30,7 +32,7 @@ std::string HexCode(HRESULT hr) {
 }
 
 BSTR ScriptText(const char* key) {
-    return SysAllocString(Widen(State().script.Value(key)).c_str());
+    return SysAllocString(::Widen(State().script.Value(key)).c_str());
 }
 
 }  // namespace
@@ -94,13 +96,11 @@ void ServiceObject<Iface>::Raise(DISPID dispid, const std::vector<long>& args) {
     std::map<DWORD, IDispatch*> sinks = m_sinks;  // a sink may unadvise meanwhile
     for (auto& sink : sinks) {
         sink.second->AddRef();
-        double at = CounterMs();
+        LogArg at = CounterMsArg();
         HRESULT hr = sink.second->Invoke(dispid, IID_NULL, 0, DISPATCH_METHOD, &params, nullptr,
                                          nullptr, nullptr);
-        char when[32];
-        snprintf(when, sizeof(when), "%.3f", at);
         LogEntry("event", std::string(m_source) + "." + std::to_string(dispid),
-                 {{false, when}, {false, HexCode(hr)}});
+                 {at, {false, HexCode(hr)}});
         sink.second->Release();
     }
 }
@@ -109,10 +109,8 @@ template <class Iface>
 HRESULT ServiceObject<Iface>::Enter(const char* method, const std::vector<LogArg>& args) {
     ServerState& state = State();
     int nth = ++state.callCounts[method];
-    char when[32];
-    snprintf(when, sizeof(when), "%.3f", CounterMs());
     std::vector<LogArg> logged = args;
-    logged.push_back({false, when});
+    logged.push_back(CounterMsArg());
     LogEntry("call", method, logged);
     for (const ScriptedFailure& failure : state.script.failures) {
         if (failure.method == method && failure.nthCall == nth) {

@@ -4,7 +4,7 @@
 
 #include <cstdlib>
 
-#include "tests/fakes/qmsrv/fake_script.h"
+#include "tests/support/file_util.h"
 
 std::vector<ServiceEntry> ParseServiceLog(const std::string& bytes) {
     std::vector<ServiceEntry> entries;
@@ -127,12 +127,12 @@ ServiceStandIn::~ServiceStandIn() {
 }
 
 void ServiceStandIn::SetScript(const std::string& text) {
-    fake::WriteWholeFile(m_script, text);
+    WriteFileBytes(m_script, text);
     DeleteFileW(m_log.c_str());
 }
 
 std::vector<ServiceEntry> ServiceStandIn::Log() const {
-    return ParseServiceLog(fake::ReadWholeFile(m_log));
+    return ParseServiceLog(ReadFileBytes(m_log));
 }
 
 std::vector<ServiceEntry> ServiceStandIn::Calls(const std::string& method) const {
