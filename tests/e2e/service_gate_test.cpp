@@ -69,6 +69,12 @@ TEST_F(ServiceGateTest, FailedCallIsRetriedOnARecreatedObjectWhoseEventEndsTheWa
     EXPECT_LT(m_endMs - m_service.TimeOf("event", "Meeting.96"), 1000);
 }
 
+TEST_F(ServiceGateTest, RejectedRequestAsksForTheErrorAndDoesNotWait) {
+    Run("StartOCMeetingResult=5\n", kStartMeeting);
+    EXPECT_EQ((std::vector<std::string>{"HasValidAccount", "StartOCMeeting", "GetLastError"}),
+              m_service.CallNames());
+}
+
 TEST_F(ServiceGateTest, NoServiceRegisteredLogsTheCreationFailure) {
     ASSERT_TRUE(m_service.Unregister());
     RunResult run = Run("", kStartMeeting);
