@@ -19,29 +19,38 @@ std::wstring FolderOf(const std::wstring& path) {
 
 bool FlushToDisk(const wchar_t* path) {
     UniqueFileHandle file(CreateFileW(path, GENERIC_WRITE, 0, nullptr, OPEN_EXISTING,
-                                      FILE_ATTRIBUTE_NORMAL, nullptr));
+                                      FILE_FLAG_OPEN_REPARSE_POINT, nullptr));
     return file && FlushFileBuffers(file.get());
 }
 
-// The staged copy takes the target's access rules, so a replaced file is
-// protected as the one it replaces. Best effort: a target we may not read the
-// rules of keeps the folder's inherited ones.
+// The staged copy takes the target's access rules and, where the account may
+// hand it on, its owner: a user's file rewritten by the system account stays
+// the user's. Best effort: a target we may not read the rules of keeps the
+// folder's inherited ones.
 void CopyAccessRules(const wchar_t* from, const wchar_t* to) {
+    PSID ownerSid = nullptr;
     PACL dacl = nullptr;
     PSECURITY_DESCRIPTOR descriptor = nullptr;
-    if (GetNamedSecurityInfoW(from, SE_FILE_OBJECT, DACL_SECURITY_INFORMATION, nullptr, nullptr,
-                              &dacl, nullptr, &descriptor) != ERROR_SUCCESS) {
+    if (GetNamedSecurityInfoW(from, SE_FILE_OBJECT,
+                              OWNER_SECURITY_INFORMATION | DACL_SECURITY_INFORMATION, &ownerSid,
+                              nullptr, &dacl, nullptr, &descriptor) != ERROR_SUCCESS) {
         return;
     }
-    UniqueLocalMem owner(descriptor);
+    UniqueLocalMem descriptorOwner(descriptor);
+    wchar_t* staging = const_cast<wchar_t*>(to);
     SECURITY_DESCRIPTOR_CONTROL control = 0;
     DWORD revision = 0;
     if (dacl != nullptr && GetSecurityDescriptorControl(descriptor, &control, &revision)) {
         SECURITY_INFORMATION info = DACL_SECURITY_INFORMATION;
         info |= (control & SE_DACL_PROTECTED) ? PROTECTED_DACL_SECURITY_INFORMATION
                                               : UNPROTECTED_DACL_SECURITY_INFORMATION;
-        SetNamedSecurityInfoW(const_cast<wchar_t*>(to), SE_FILE_OBJECT, info, nullptr, nullptr,
-                              dacl, nullptr);
+        SetNamedSecurityInfoW(staging, SE_FILE_OBJECT, info, nullptr, nullptr, dacl, nullptr);
+    }
+    if (ownerSid != nullptr) {
+        // Needs the restore privilege for another account's owner; without it
+        // the file stays ours, its access rules as above.
+        SetNamedSecurityInfoW(staging, SE_FILE_OBJECT, OWNER_SECURITY_INFORMATION, ownerSid,
+                              nullptr, nullptr, nullptr);
     }
 }
 
@@ -59,7 +68,8 @@ bool StagedFile::Begin() {
     Discard();
     std::wstring folder = FolderOf(m_target);
     wchar_t staging[MAX_PATH] = {};
-    if (folder.empty() || folder.size() >= MAX_PATH - 14 ||
+    // GetTempFileNameW takes a folder of up to MAX_PATH - 14 characters.
+    if (folder.empty() || folder.size() > MAX_PATH - 14 ||
         GetTempFileNameW(folder.c_str(), L"qm~", 0, staging) == 0) {
         TraceLevel4(TraceValue("StagedFile: cannot create a staging file beside"),
                     TraceNamed("target", m_target.c_str()),
@@ -75,7 +85,7 @@ bool StagedFile::Write(const void* bytes, size_t size) {
         return false;
     }
     UniqueFileHandle file(CreateFileW(m_staging.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_ALWAYS,
-                                      FILE_ATTRIBUTE_NORMAL, nullptr));
+                                      FILE_FLAG_OPEN_REPARSE_POINT, nullptr));
     DWORD written = 0;
     return file && WriteFile(file.get(), bytes, static_cast<DWORD>(size), &written, nullptr) &&
            written == size;
@@ -93,6 +103,14 @@ bool StagedFile::Commit() {
         return false;
     }
     DWORD attributes = GetFileAttributesW(m_target.c_str());
+    // Windows refuses to replace a read-only file; so do we where the
+    // attribute would be ignored (an account that bypasses file modes).
+    if (attributes != INVALID_FILE_ATTRIBUTES && (attributes & FILE_ATTRIBUTE_READONLY)) {
+        TraceLevel4(TraceValue("StagedFile: the target is read-only"),
+                    TraceNamed("target", m_target.c_str()));
+        Discard();
+        return false;
+    }
     if (attributes != INVALID_FILE_ATTRIBUTES) {
         CopyAccessRules(m_target.c_str(), m_staging.c_str());
     }
@@ -106,7 +124,11 @@ bool StagedFile::Commit() {
     }
     m_committed = true;
     if (attributes != INVALID_FILE_ATTRIBUTES) {
-        SetFileAttributesW(m_target.c_str(), attributes & ~FILE_ATTRIBUTE_TEMPORARY);
+        // Only what a file may be given (a replaced link's reparse flag is not).
+        const DWORD kept =
+            attributes & (FILE_ATTRIBUTE_HIDDEN | FILE_ATTRIBUTE_SYSTEM | FILE_ATTRIBUTE_ARCHIVE |
+                          FILE_ATTRIBUTE_NOT_CONTENT_INDEXED);
+        SetFileAttributesW(m_target.c_str(), kept != 0 ? kept : FILE_ATTRIBUTE_NORMAL);
     }
     return true;
 }

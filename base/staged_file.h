@@ -26,8 +26,10 @@ public:
     const wchar_t* Path() const { return m_staging.c_str(); }
     // Writes bytes into the staging file (replacing what it holds).
     bool Write(const void* bytes, size_t size);
-    // Flushes the staging file, gives it the target's attributes and access
-    // rules, and moves it over the target. False leaves the target as it was.
+    // Flushes the staging file, gives it the target's access rules and owner,
+    // moves it over the target and gives it the target's attributes. A
+    // read-only target is not replaced. False leaves the target as it was
+    // and removes the staging file.
     bool Commit();
 
 private:

@@ -127,6 +127,14 @@ void RemoveQMInstallPathFromSystemEnv(const wchar_t* installFolder) {
         return;
     }
     // Whole entries only, so that C:\Suite\qm2 survives the removal of C:\Suite\qm.
-    WriteSystemPath(RemovePathEntries(path.c_str(), folder.c_str()).c_str());
+    CStringEx remaining = RemovePathEntries(path.c_str(), folder.c_str());
+    if (remaining.IsEmpty()) {
+        // An empty machine Path leaves every program without the system
+        // folders; a Path that held only the suite folder is left as it is.
+        TraceLevel4(TraceValue(
+            "CQMCommon::RemoveQMInstallPathFromSystemEnv: the Path would be empty, left as it is"));
+        return;
+    }
+    WriteSystemPath(remaining.c_str());
     RefreshSysEnv();
 }

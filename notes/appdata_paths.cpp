@@ -3,6 +3,7 @@
 #include <shlobj.h>
 
 #include "base/com_owners.h"
+#include "base/reparse_guard.h"
 #include "base/trace.h"
 #include "notes/plugin_paths.h"
 #include "notes/product_locations.h"
@@ -10,16 +11,6 @@
 namespace {
 
 const size_t kAppDataLimitChars = 2 * MAX_PATH;
-
-// folder = folder joined with name; false when that would not fit.
-bool Append(wchar_t (&folder)[MAX_PATH], const wchar_t* name) {
-    wchar_t joined[MAX_PATH];
-    if (!JoinFilePath(folder, name, joined)) {
-        return false;
-    }
-    wcscpy(folder, joined);
-    return true;
-}
 
 }  // namespace
 
@@ -43,22 +34,30 @@ bool GetAppDataMrvQMPath(const wchar_t* name, CStringEx& out) {
         TraceLevel1(TraceValue("GetAppDataMrvQMPath: Get FilePath was overload!"));
         return false;
     }
-    // An existing folder is fine; a folder that cannot be created shows in
-    // the caller's own file work.
-    bool built = Append(folder, L"Mirovan");
-    if (built) {
-        CreateDirectoryW(folder, nullptr);
-        built = Append(folder, L"Quillmark Tools");
-    }
-    if (built) {
-        CreateDirectoryW(folder, nullptr);
-        built = name[0] == L'\0' || Append(folder, name);
+    wchar_t mirovan[MAX_PATH];
+    wchar_t suite[MAX_PATH];
+    wchar_t path[MAX_PATH];
+    bool built = JoinFilePath(folder, L"Mirovan", mirovan) &&
+                 JoinFilePath(mirovan, L"Quillmark Tools", suite);
+    if (built && name[0] == L'\0') {
+        wcscpy(path, suite);
+    } else if (built) {
+        built = JoinFilePath(suite, name, path);
     }
     if (!built) {
         TraceLevel1(TraceValue("GetAppDataMrvQMPath: Get FilePath was overload!"));
         return false;
     }
-    TraceLevel1(TraceValue("GetAppDataMrvQMPath"), TraceNamed("strFilePath", folder));
-    out = folder;
+    // The folders are the user's: a link planted in them would carry the
+    // caller's file work elsewhere.
+    if (!IsFreeOfReparsePoints(folder, path)) {
+        return false;
+    }
+    // An existing folder is fine; a folder that cannot be created shows in
+    // the caller's own file work.
+    CreateDirectoryW(mirovan, nullptr);
+    CreateDirectoryW(suite, nullptr);
+    TraceLevel1(TraceValue("GetAppDataMrvQMPath"), TraceNamed("strFilePath", path));
+    out = path;
     return true;
 }

@@ -2,6 +2,7 @@
 
 #include <windows.h>
 
+#include "base/reparse_guard.h"
 #include "base/string_ex.h"
 #include "notes/plugin_paths.h"
 #include "notes/product_locations.h"
@@ -33,8 +34,11 @@ void ResetEclipseConfigStamp(const wchar_t* baseFolder) {
     if (IsEmptyText(baseFolder)) {
         return;
     }
+    // baseFolder may be the user's Notes data folder: the stamp work never
+    // follows a reparse point below it.
     CStringEx folder = JoinLocalPath(baseFolder, kUpdateConfigFolder);
-    if (IsUsableFolder(folder.c_str())) {
+    CStringEx stamp = JoinLocalPath(folder.c_str(), kStamp);
+    if (IsUsableFolder(folder.c_str()) && IsFreeOfReparsePoints(baseFolder, stamp.c_str())) {
         RenameConfigStamp(folder.c_str());
     }
 }

@@ -7,5 +7,6 @@
 void RenameConfigStamp(const wchar_t* configFolder);
 
 // The stamp of an Eclipse installation or data folder: the rename above in
-// baseFolder\configuration\org.eclipse.update, when that folder exists.
+// baseFolder\configuration\org.eclipse.update, when that folder exists and
+// no reparse point below baseFolder leads elsewhere.
 void ResetEclipseConfigStamp(const wchar_t* baseFolder);

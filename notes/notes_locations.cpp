@@ -8,6 +8,7 @@
 #include "base/trace.h"
 #include "base/user_profile.h"
 #include "notes/location_values.h"
+#include "notes/plugin_paths.h"
 #include "notes/product_locations.h"
 
 namespace {
@@ -17,13 +18,17 @@ const wchar_t kCitrixKey[] = L"SOFTWARE\\Citrix\\Citrix Management Console";
 const wchar_t kNotesFolderName[] = L"Notes";
 const DWORD kVersionTextChars = MAX_PATH;
 
-// The first Notes key under root whose value `name` fits the buffer.
-bool ReadFirstNotesValue(HKEY root, const wchar_t* name, wchar_t* buffer, DWORD capacity) {
+// The first Notes key under root whose folder value `name` fits the buffer
+// and is a full path. A relative value would make the callers act in the
+// working folder (under an installer, the system folder): it counts as absent.
+bool ReadFirstNotesFolder(HKEY root, const wchar_t* name, wchar_t* buffer, DWORD capacity) {
     for (const wchar_t* key : kNotesKeys) {
-        if (ReadFittingValue(root, key, name, KEY_QUERY_VALUE, buffer, capacity)) {
+        if (ReadFittingValue(root, key, name, KEY_QUERY_VALUE, buffer, capacity) &&
+            IsFullFolderPath(buffer)) {
             return true;
         }
     }
+    ClearLocation(buffer, capacity);
     return false;
 }
 
@@ -81,7 +86,7 @@ bool GetNotesPath(wchar_t* lpszPath, DWORD capacity) {
     if (lpszPath == nullptr) {
         return false;
     }
-    return ReadFirstNotesValue(HKEY_LOCAL_MACHINE, L"Path", lpszPath, capacity);
+    return ReadFirstNotesFolder(HKEY_LOCAL_MACHINE, L"Path", lpszPath, capacity);
 }
 
 DWORD GetNotesVersion() {
@@ -176,7 +181,9 @@ bool GetEmbeddedSTDataPath(wchar_t* lpszPath, DWORD capacity, DWORD* version) {
             if (GetRegString(userRoot, key, L"NotesIniPath", lpszPath, capacity, 0)) {
                 // The data folder is the one that holds notes.ini.
                 PathRemoveFileSpecW(lpszPath);
-                return true;
+                if (IsFullFolderPath(lpszPath)) {
+                    return true;
+                }
             }
         }
         ClearLocation(lpszPath, capacity);
@@ -188,5 +195,5 @@ bool GetEmbeddedSTDataPath(wchar_t* lpszPath, DWORD capacity, DWORD* version) {
         return false;
     }
     TraceLevel1(TraceValue("Lotus Notes is NOT installed on Citrix Server"));
-    return ReadFirstNotesValue(HKEY_LOCAL_MACHINE, L"DataPath", lpszPath, capacity);
+    return ReadFirstNotesFolder(HKEY_LOCAL_MACHINE, L"DataPath", lpszPath, capacity);
 }

@@ -3,6 +3,7 @@
 #include <msxml2.h>
 
 #include "base/com_owners.h"
+#include "base/staged_file.h"
 #include "base/trace.h"
 #include "notes/untrusted_xml_bytes.h"
 
@@ -128,10 +129,16 @@ public:
         return m_site->removeChild(feature.Get(), removed.ReleaseAndGetAddressOf()) == S_OK;
     }
 
+    // The document goes to a staging file beside path, which then replaces
+    // path in one step: a save that fails part-way leaves path as it was.
     bool Save(const wchar_t* path) {
+        StagedFile staged(path);
+        if (!staged.Begin()) {
+            return false;
+        }
         UniqueVariant destination;
-        SetStringVariant(destination, path);
-        return m_doc->save(*destination.get()) == S_OK;
+        SetStringVariant(destination, staged.Path());
+        return m_doc->save(*destination.get()) == S_OK && staged.Commit();
     }
 
 private:
@@ -224,11 +231,14 @@ PlatformXmlEdit EditPlatformXml(const wchar_t* path, const SiteXPaths& sites, bo
         }
         result.changed = true;
     }
+    if (!result.changed) {
+        return result;  // the file already says what was asked
+    }
     if (gate != nullptr && !gate(path)) {
         return result;  // not writable: left as it is, silently
     }
     result.saved = xml.Save(path);
-    if (!result.saved && result.changed) {
+    if (!result.saved) {
         result.status = PlatformXmlStatus::kSaveFailed;
     }
     return result;

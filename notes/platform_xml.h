@@ -23,8 +23,8 @@ enum class PlatformXmlStatus {
 // Site expressions, tried in order; the first that selects an element wins.
 using SiteXPaths = std::vector<const wchar_t*>;
 
-// Decides, after the edit, whether the document is written back (for
-// example IsFileAllowRW); null writes it always.
+// Decides, after an edit that changed the document, whether it is written
+// back (for example IsFileAllowRW); null writes it always.
 using SaveGate = bool (*)(const wchar_t* path);
 
 struct PlatformXmlEdit {
@@ -33,10 +33,11 @@ struct PlatformXmlEdit {
     bool saved = false;    // the document was written back
 };
 
-// Adds (enable) or removes (disable) the feature element below the site and
-// writes the document back when the gate allows it, changed or not. A
-// failed write counts as failure only when the document had changed: an
-// unchanged file already says what was asked for.
+// Adds (enable) or removes (disable) the feature element below the site and,
+// when that changed the document and the gate allows it, writes it back
+// through a staging file that replaces the original in one step. An
+// unchanged document is not written at all. A failed write is kSaveFailed
+// and leaves the file byte for byte as it was.
 PlatformXmlEdit EditPlatformXml(const wchar_t* path, const SiteXPaths& sites, bool enable,
                                 SaveGate gate);
 

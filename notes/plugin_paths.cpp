@@ -49,15 +49,19 @@ bool JoinFilePath(const wchar_t* folder, const wchar_t* relative, wchar_t (&out)
     return true;
 }
 
-bool IsUsableFolder(const wchar_t* folder) {
-    if (folder == nullptr || wcsnlen(folder, MAX_PATH) >= MAX_PATH) {
+bool IsFullFolderPath(const wchar_t* folder) {
+    if (folder == nullptr || folder[0] == L'\0') {
         return false;
     }
     bool driveRooted =
         ((folder[0] >= L'A' && folder[0] <= L'Z') || (folder[0] >= L'a' && folder[0] <= L'z')) &&
         folder[1] == L':' && IsSeparator(folder[2]);
     bool unc = IsSeparator(folder[0]) && IsSeparator(folder[1]) && folder[2] != L'\0';
-    if (!driveRooted && !unc) {
+    return driveRooted || unc;
+}
+
+bool IsUsableFolder(const wchar_t* folder) {
+    if (folder == nullptr || wcsnlen(folder, MAX_PATH) >= MAX_PATH || !IsFullFolderPath(folder)) {
         return false;
     }
     DWORD attributes = GetFileAttributesW(folder);

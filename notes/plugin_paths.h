@@ -12,9 +12,12 @@
 // fit MAX_PATH characters with its terminator.
 bool JoinFilePath(const wchar_t* folder, const wchar_t* relative, wchar_t (&out)[MAX_PATH]);
 
-// True for an existing folder named by a full path ("X:\..." or "\\server\share...")
-// shorter than MAX_PATH. An empty or relative path names the current folder or
-// a drive root by accident, so it never qualifies.
+// True for a full path: "X:\..." or "\\server\share...". An empty, relative
+// ("rel", ".", "..") or drive-relative ("C:rel", "\rel") path names a place
+// relative to the working folder or its drive, so it never qualifies.
+bool IsFullFolderPath(const wchar_t* folder);
+
+// True for an existing folder named by a full path shorter than MAX_PATH.
 bool IsUsableFolder(const wchar_t* folder);
 
 // True for a null or empty text.

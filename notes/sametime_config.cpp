@@ -4,6 +4,7 @@
 
 #include <string>
 
+#include "base/reparse_guard.h"
 #include "base/trace.h"
 #include "notes/config_stamp.h"
 #include "notes/plugin_paths.h"
@@ -108,7 +109,7 @@ CStringEx FolderOf(const CStringEx& file) {
 }
 
 // The embedded layout's platform.xml, or false (logging notFound when the data
-// folder exists but the file does not).
+// folder is found but the file is missing or lies behind a reparse point).
 bool FindEmbeddedConfig(CStringEx& path, const char* notFound) {
     wchar_t data[kLocationCapacity] = {};
     DWORD version = sl::kPresetVersion;
@@ -116,7 +117,8 @@ bool FindEmbeddedConfig(CStringEx& path, const char* notFound) {
         return false;
     }
     path = JoinLocalPath(data, sl::kEmbeddedPlatformXml);
-    if (!IsRegularFile(path.c_str())) {
+    // The data folder may be the user's: nothing below it may lead elsewhere.
+    if (!IsRegularFile(path.c_str()) || !IsFreeOfReparsePoints(data, path.c_str())) {
         LogFailure(notFound);
         return false;
     }

@@ -4,6 +4,7 @@
 #include <shlwapi.h>
 #include <wchar.h>
 
+#include "base/reparse_guard.h"
 #include "base/trace.h"
 #include "base/win_handles.h"
 #include "notes/location_values.h"
@@ -66,12 +67,13 @@ bool GetSametimePathWithClock(wchar_t* lpszPath, DWORD capacity, DWORD* version,
             wcsstr(displayName, kSametimeConnect) == nullptr) {
             continue;
         }
-        // An entry whose install folder is missing or does not fit the
-        // caller's buffer names no usable folder: keep looking rather than
-        // report an empty or cut-off path as found.
+        // An entry whose install folder is missing, does not fit the
+        // caller's buffer or is relative (it would name a place in the
+        // working folder) names no usable folder: keep looking rather than
+        // report it as found.
         if (lpszPath != nullptr &&
             (!ReadFittingValue(entry.get(), L"InstallLocation", lpszPath, capacity) ||
-             lpszPath[0] == L'\0')) {
+             !IsFullFolderPath(lpszPath))) {
             ClearLocation(lpszPath, capacity);
             continue;
         }
@@ -95,8 +97,11 @@ bool GetSametimeConfigPath(int profile, CStringEx& out) {
     }
     wchar_t appData[MAX_PATH] = {};
     wchar_t path[MAX_PATH] = {};
+    // The profile belongs to the user: a link planted in it must not carry
+    // the configuration edit elsewhere.
     if (!SHGetSpecialFolderPathW(nullptr, appData, CSIDL_APPDATA, TRUE) ||
-        !JoinFilePath(appData, kPlatformXmlOfProfile[profile], path) || !PathFileExistsW(path)) {
+        !JoinFilePath(appData, kPlatformXmlOfProfile[profile], path) || !PathFileExistsW(path) ||
+        !IsFreeOfReparsePoints(appData, path)) {
         TraceLevel8(TraceValue("GetSametimeConfigPath: platform.xml file can not be found!"));
         return false;
     }

@@ -1,6 +1,7 @@
 // Copying the meeting feature into the Sametime client layouts.
 #include "notes/sametime_plugin_files.h"
 
+#include "base/reparse_guard.h"
 #include "base/trace.h"
 #include "notes/plugin_paths.h"
 #include "notes/notes_plugin_files.h"
@@ -30,10 +31,19 @@ bool CopyFeatureDescriptor(const wchar_t* installFolder, const CStringEx& featur
     return CopyWithBackup(installFolder, sl::kFeatureXml, featureFolder);
 }
 
-// The plain copy of the embedded files, with its trace of both paths.
-bool CopyEmbeddedFile(const CStringEx& source, const CStringEx& target) {
+// The plain copy of the embedded files into the Notes data folder, with its
+// trace of both paths; the target's folder is created first when one is
+// named (one level, an existing folder is fine). The data folder may be the
+// user's own: a target behind a reparse point below it is refused like a
+// failed copy.
+bool CopyEmbeddedFile(const wchar_t* dataFolder, const CStringEx& source, const CStringEx& target,
+                      const wchar_t* folderToCreate = nullptr) {
     TraceLevel1(TraceNamed("szTargetFilePath", target), TraceNamed("szSourceFilePath", source));
-    if (!CopyFileW(source.c_str(), target.c_str(), FALSE)) {
+    const bool allowed = IsFreeOfReparsePoints(dataFolder, target.c_str());
+    if (allowed && folderToCreate != nullptr) {
+        CreateDirectoryW(folderToCreate, nullptr);
+    }
+    if (!allowed || !CopyFileW(source.c_str(), target.c_str(), FALSE)) {
         LogFailure("NIHandle::CopyEmbeddedST8PluginFiles: CopyFile Failed!");
         return false;
     }
@@ -110,16 +120,22 @@ bool CopyEmbeddedST8PluginFiles(const wchar_t* notesFolder, const wchar_t* insta
         LogFailure("NIHandle:CopyEmbeddedST8PluginFiles: Input Para is NULL!");
         return false;
     }
-    if (IsEmptyText(notesFolder) || IsEmptyText(installFolder)) {
+    if (IsEmptyText(installFolder)) {
         return false;
     }
-    CStringEx source = JoinLocalPath(installFolder, sl::kNativeLibrary);
-    CStringEx target = JoinLocalPath(notesFolder, sl::kNativeLibrary);
-    if (!CopyFileW(source.c_str(), target.c_str(), FALSE)) {
-        LogFailure("NIHandle:: CopyEmbeddedST8PluginFiles: CopyFile Failed!");
+    // Only the native library goes into the Notes program folder. The jar and
+    // the feature go to the data folder, found on its own, so a program
+    // folder that was not found (or is relative) holds only the library back.
+    const bool notesFound = IsFullFolderPath(notesFolder);
+    if (notesFound) {
+        CStringEx source = JoinLocalPath(installFolder, sl::kNativeLibrary);
+        CStringEx target = JoinLocalPath(notesFolder, sl::kNativeLibrary);
+        if (!CopyFileW(source.c_str(), target.c_str(), FALSE)) {
+            LogFailure("NIHandle:: CopyEmbeddedST8PluginFiles: CopyFile Failed!");
+        }
     }
     CopyEmbeddedST8FilesForMultiUser(installFolder);
-    return true;
+    return notesFound;
 }
 
 bool CopyEmbeddedST8FilesForMultiUser(const wchar_t* installFolder) {
@@ -133,12 +149,12 @@ bool CopyEmbeddedST8FilesForMultiUser(const wchar_t* installFolder) {
         return false;
     }
     CopyEmbeddedFile(
-        JoinLocalPath(installFolder, sl::kJar),
+        data, JoinLocalPath(installFolder, sl::kJar),
         JoinLocalPath(JoinLocalPath(data, sl::kEmbeddedPluginsFolder).c_str(), sl::kJar));
 
     CStringEx featureFolder = JoinLocalPath(
         JoinLocalPath(data, sl::kEmbeddedFeaturesFolder).c_str(), sl::kFeatureFolderName);
-    CreateDirectoryW(featureFolder.c_str(), nullptr);
-    return CopyEmbeddedFile(JoinLocalPath(installFolder, sl::kFeatureXml),
-                            JoinLocalPath(featureFolder.c_str(), sl::kFeatureXml));
+    return CopyEmbeddedFile(data, JoinLocalPath(installFolder, sl::kFeatureXml),
+                            JoinLocalPath(featureFolder.c_str(), sl::kFeatureXml),
+                            featureFolder.c_str());
 }

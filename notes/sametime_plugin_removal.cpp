@@ -2,6 +2,7 @@
 // at the next restart.
 #include <cstdio>
 
+#include "base/reparse_guard.h"
 #include "base/trace.h"
 #include "notes/plugin_paths.h"
 #include "notes/product_locations.h"
@@ -39,11 +40,22 @@ CStringEx FeatureXmlIn(const wchar_t* featuresFolder) {
     return Join(FeatureFolderIn(featuresFolder).c_str(), sl::kFeatureXml);
 }
 
-// Deletes each existing file in order; the first failed deletion stops the walk.
-bool DeleteSteps(const wchar_t* base, const RemovalStep* steps, size_t count) {
+// Whether base is a folder the console user controls (the Notes data
+// folder): nothing is deleted there through a reparse point below it.
+enum class BaseFolder { kMachine, kUser };
+
+bool MayActOn(const wchar_t* base, BaseFolder kind, const CStringEx& path) {
+    return kind == BaseFolder::kMachine || IsFreeOfReparsePoints(base, path.c_str());
+}
+
+// Deletes each existing file in order; the first failed (or refused)
+// deletion stops the walk.
+bool DeleteSteps(const wchar_t* base, const RemovalStep* steps, size_t count,
+                 BaseFolder kind = BaseFolder::kMachine) {
     for (size_t i = 0; i < count; ++i) {
         CStringEx path = Join(base, steps[i].relativePath.c_str());
-        if (IsRegularFile(path.c_str()) && !DeleteFileW(path.c_str())) {
+        if (IsRegularFile(path.c_str()) &&
+            (!MayActOn(base, kind, path) || !DeleteFileW(path.c_str()))) {
             LogFailure(steps[i].failure);
             return false;
         }
@@ -51,8 +63,9 @@ bool DeleteSteps(const wchar_t* base, const RemovalStep* steps, size_t count) {
     return true;
 }
 
-void RemoveFolderIfPresent(const CStringEx& folder) {
-    if (IsUsableFolder(folder.c_str())) {
+void RemoveFolderIfPresent(const wchar_t* base, const CStringEx& folder,
+                           BaseFolder kind = BaseFolder::kMachine) {
+    if (IsUsableFolder(folder.c_str()) && MayActOn(base, kind, folder)) {
         RemoveDirectoryW(folder.c_str());
     }
 }
@@ -74,7 +87,7 @@ bool RemoveConnectFiles(const wchar_t* folder, const wchar_t* nativeFolder,
     if (!DeleteSteps(folder, steps, sizeof(steps) / sizeof(steps[0]))) {
         return false;
     }
-    RemoveFolderIfPresent(Join(folder, FeatureFolderIn(featuresFolder).c_str()));
+    RemoveFolderIfPresent(folder, Join(folder, FeatureFolderIn(featuresFolder).c_str()));
     return true;
 }
 
@@ -94,6 +107,11 @@ bool AcceptRemovalFolder(const wchar_t* folder, const char* nullMessage) {
 // MoveFileEx with no target: deleted at the next restart; the file need not exist.
 bool ScheduleDeletion(const CStringEx& path) {
     return MoveFileExW(path.c_str(), nullptr, MOVEFILE_DELAY_UNTIL_REBOOT) != FALSE;
+}
+
+// The same below the Notes data folder, refused through a reparse point.
+bool ScheduleDeletionInData(const wchar_t* data, const CStringEx& path) {
+    return MayActOn(data, BaseFolder::kUser, path) && ScheduleDeletion(path);
 }
 
 void LogSystemError(const char* format) {
@@ -120,15 +138,16 @@ bool ScheduleEmbeddedRemoval() {
         return true;
     }
     CStringEx features = Join(data, sl::kEmbeddedFeaturesFolder);
-    if (!ScheduleDeletion(Join(Join(data, sl::kEmbeddedPluginsFolder).c_str(), sl::kJar))) {
+    if (!ScheduleDeletionInData(data,
+                                Join(Join(data, sl::kEmbeddedPluginsFolder).c_str(), sl::kJar))) {
         TraceLevel1(TraceValue(kMoveFailed));
         return false;
     }
-    if (!ScheduleDeletion(FeatureXmlIn(features.c_str()))) {
+    if (!ScheduleDeletionInData(data, FeatureXmlIn(features.c_str()))) {
         LogSystemError("MoveFileEx FAILED: RemoveEmbedST8PluginFiles error=%d\n");
         return false;
     }
-    ScheduleDeletion(FeatureFolderIn(features.c_str()));
+    ScheduleDeletionInData(data, FeatureFolderIn(features.c_str()));
     return true;
 }
 
@@ -180,10 +199,12 @@ bool RemoveEmbeddedST8PluginFiles(const wchar_t* notesFolder) {
         {Join(sl::kEmbeddedPluginsFolder, sl::kJar), kST8DeleteFailed},
         {FeatureXmlIn(sl::kEmbeddedFeaturesFolder), kST8DeleteFailed},
     };
-    if (!DeleteSteps(data, dataSteps, sizeof(dataSteps) / sizeof(dataSteps[0]))) {
+    if (!DeleteSteps(data, dataSteps, sizeof(dataSteps) / sizeof(dataSteps[0]),
+                     BaseFolder::kUser)) {
         return false;
     }
-    RemoveFolderIfPresent(Join(data, FeatureFolderIn(sl::kEmbeddedFeaturesFolder).c_str()));
+    RemoveFolderIfPresent(data, Join(data, FeatureFolderIn(sl::kEmbeddedFeaturesFolder).c_str()),
+                          BaseFolder::kUser);
     return true;
 }
 

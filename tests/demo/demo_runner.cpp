@@ -1,12 +1,15 @@
 // Runs qmMrvONI.exe for the demo and prints what it did: the command line,
 // each trace record it wrote (level and text) and its exit code.
 //   demo_runner.exe <program folder> <arguments>...
-// Each further argument is one command line after the program name.
+// Each further argument is one command line after the program name; "{caller}"
+// in it stands for the handle of a window of the runner's that prints the
+// WM_COPYDATA messages it receives, as a calling suite program would get them.
 #include <windows.h>
 
 #include <cstdio>
 #include <string>
 
+#include "tests/fakes/caller/feedback_receiver.h"
 #include "tests/support/file_util.h"
 #include "tests/support/program_run.h"
 
@@ -36,8 +39,13 @@ int wmain(int argc, wchar_t** argv) {
     std::wstring folder = argv[1];
     std::wstring program = JoinPath(folder, L"qmMrvONI.exe");
     std::wstring traceLog = JoinPath(folder, L"demo-trace.log");
+    FeedbackWindow caller;
     for (int i = 2; i < argc; ++i) {
         std::wstring arguments = argv[i];
+        for (size_t at; (at = arguments.find(L"{caller}")) != std::wstring::npos;) {
+            arguments.replace(at, 8, caller.HandleText());
+        }
+        size_t received = caller.Received().size();
         printf("\n$ qmMrvONI.exe %s\n", Narrow(arguments).c_str());
         DeleteFileW(traceLog.c_str());
         RunResult run;
@@ -48,6 +56,10 @@ int wmain(int argc, wchar_t** argv) {
             printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
             PrintRecordText(record.text);
             printf("\n");
+        }
+        std::vector<CopyData> messages = caller.Received();
+        for (size_t m = received; m < messages.size(); ++m) {
+            printf("  WM_COPYDATA to the caller: %s\n", Narrow(messages[m].text).c_str());
         }
         printf("  exit code: %d\n", run.exitCode);
         fflush(stdout);

@@ -65,10 +65,10 @@ TEST_F(PlatformXml, EnableAppendsTheFeatureOnceAsTheSitesLastChild) {
     EXPECT_LT(text.find("com.example.chat"), feature);
     EXPECT_EQ(text.find("</site>", sharedSite), text.find("</site>", feature));
 
-    // Again: written back unchanged, still one element.
+    // Again: nothing to change, nothing written, still one element.
     edit = Edit(true);
     EXPECT_EQ(PlatformXmlStatus::kOk, edit.status);
-    EXPECT_TRUE(!edit.changed && edit.saved);
+    EXPECT_TRUE(!edit.changed && !edit.saved);
     EXPECT_EQ(text, Read());
 }
 

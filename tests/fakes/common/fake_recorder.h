@@ -5,6 +5,7 @@
 
 #include <windows.h>
 
+#include <cstdio>
 #include <string>
 
 namespace fake {
@@ -18,8 +19,7 @@ inline std::wstring EnvironmentValue(const wchar_t* name) {
     return std::wstring(value, length);
 }
 
-inline void AppendToFileNamedBy(const wchar_t* variable, const std::string& entry) {
-    std::wstring path = EnvironmentValue(variable);
+inline void AppendToFile(const std::wstring& path, const std::string& entry) {
     if (path.empty()) {
         return;
     }
@@ -33,9 +33,31 @@ inline void AppendToFileNamedBy(const wchar_t* variable, const std::string& entr
     CloseHandle(file);
 }
 
-// One line in the calls log named by QM_FAKE_CALLS_LOG.
+inline void AppendToFileNamedBy(const wchar_t* variable, const std::string& entry) {
+    AppendToFile(EnvironmentValue(variable), entry);
+}
+
+// Milliseconds on the machine-wide performance counter: comparable between
+// processes, for the benchmarks.
+inline double CounterMilliseconds() {
+    LARGE_INTEGER now, frequency;
+    QueryPerformanceCounter(&now);
+    QueryPerformanceFrequency(&frequency);
+    return static_cast<double>(now.QuadPart) * 1000.0 / static_cast<double>(frequency.QuadPart);
+}
+
+// line followed by " @<ms>" (CounterMilliseconds).
+inline std::string Stamped(const std::string& line) {
+    char stamp[64];
+    snprintf(stamp, sizeof(stamp), " @%.3f", CounterMilliseconds());
+    return line + stamp;
+}
+
+// One line in the calls log named by QM_FAKE_CALLS_LOG, stamped when
+// QM_FAKE_STAMP_CALLS is "1".
 inline void RecordCall(const std::string& line) {
-    AppendToFileNamedBy(L"QM_FAKE_CALLS_LOG", line + "\n");
+    bool stamp = EnvironmentValue(L"QM_FAKE_STAMP_CALLS") == L"1";
+    AppendToFileNamedBy(L"QM_FAKE_CALLS_LOG", (stamp ? Stamped(line) : line) + "\n");
 }
 
 }  // namespace fake
