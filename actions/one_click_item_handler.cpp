@@ -115,7 +115,7 @@ bool COneClickItemHandler::CallActionMethod(int nAction) {
         if (entry.nAction == nAction) {
             (items->*entry.method)(WindowArgument(OwnerWindowUnderCursor()));
             if (nAction == kActionStartScheduledMeeting) {
-                PumpMessagesFor(kScheduledMeetingWaitMs);
+                DispatchMessagesFor(kScheduledMeetingWaitMs);
             }
             return true;
         }

@@ -47,18 +47,6 @@ std::string BigConfig() {
     return text + "</config>\n";
 }
 
-bool WriteAll(const std::wstring& path, const std::string& bytes) {
-    HANDLE file = CreateFileW(path.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_ALWAYS,
-                              FILE_ATTRIBUTE_NORMAL, nullptr);
-    if (file == INVALID_HANDLE_VALUE) {
-        return false;
-    }
-    DWORD written = 0;
-    BOOL ok = WriteFile(file, bytes.data(), static_cast<DWORD>(bytes.size()), &written, nullptr);
-    CloseHandle(file);
-    return ok && written == bytes.size();
-}
-
 std::string ReadAll(const std::wstring& path) {
     std::string bytes;
     HANDLE file = CreateFileW(path.c_str(), GENERIC_READ, FILE_SHARE_READ, nullptr, OPEN_EXISTING,
@@ -89,7 +77,7 @@ int wmain(int argc, wchar_t** argv) {
     std::wstring folder = std::wstring(temp) + L"qm-platform-xml-bench";
     CreateDirectoryW(folder.c_str(), nullptr);
     std::wstring path = folder + L"\\platform.xml";
-    if (!WriteAll(path, BigConfig())) {
+    if (!WriteWholeFile(path, BigConfig())) {
         std::printf("cannot write %ls\n", path.c_str());
         return 1;
     }
@@ -105,7 +93,7 @@ int wmain(int argc, wchar_t** argv) {
     bool allOk = true;
     for (int i = 0; i < repetitions; ++i) {
         double start = NowMilliseconds();
-        allOk &= WriteAll(path, ReadAll(path));
+        allOk &= WriteWholeFile(path, ReadAll(path));
         raw.ms.push_back(NowMilliseconds() - start);
 
         start = NowMilliseconds();

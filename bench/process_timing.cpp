@@ -41,12 +41,54 @@ double MeanProcessMilliseconds(const std::wstring& commandLine, int runs, int wa
     return (NowMilliseconds() - start) / runs;
 }
 
-std::wstring BenchBinDir() {
+int RunQuietly(const std::wstring& commandLine) {
+    SECURITY_ATTRIBUTES inherit = {sizeof(inherit), nullptr, TRUE};
+    HANDLE nul =
+        CreateFileW(L"NUL", GENERIC_READ | GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE,
+                    &inherit, OPEN_EXISTING, 0, nullptr);
+    STARTUPINFOW startup = {};
+    startup.cb = sizeof(startup);
+    startup.dwFlags = STARTF_USESTDHANDLES;
+    startup.hStdInput = nul;
+    startup.hStdOutput = nul;
+    startup.hStdError = nul;
+    std::vector<wchar_t> line(commandLine.begin(), commandLine.end());
+    line.push_back(L'\0');
+    PROCESS_INFORMATION info = {};
+    int code = -1;
+    if (CreateProcessW(nullptr, line.data(), nullptr, nullptr, TRUE, CREATE_NO_WINDOW, nullptr,
+                       nullptr, &startup, &info)) {
+        WaitForSingleObject(info.hProcess, INFINITE);
+        DWORD exitCode = 0;
+        GetExitCodeProcess(info.hProcess, &exitCode);
+        code = static_cast<int>(exitCode);
+        CloseHandle(info.hThread);
+        CloseHandle(info.hProcess);
+    }
+    if (nul != INVALID_HANDLE_VALUE) {
+        CloseHandle(nul);
+    }
+    return code;
+}
+
+std::wstring BuildBinDir() {
     wchar_t path[MAX_PATH] = {};
     GetModuleFileNameW(nullptr, path, MAX_PATH);
     PathRemoveFileSpecW(path);  // bin/bench
     PathRemoveFileSpecW(path);  // bin
     return path;
+}
+
+bool WriteWholeFile(const std::wstring& path, const std::string& bytes) {
+    HANDLE file = CreateFileW(path.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_ALWAYS,
+                              FILE_ATTRIBUTE_NORMAL, nullptr);
+    if (file == INVALID_HANDLE_VALUE) {
+        return false;
+    }
+    DWORD written = 0;
+    BOOL ok = WriteFile(file, bytes.data(), static_cast<DWORD>(bytes.size()), &written, nullptr);
+    CloseHandle(file);
+    return ok && written == bytes.size();
 }
 
 ProgramCopy::ProgramCopy(const wchar_t* folderName) {
@@ -55,7 +97,7 @@ ProgramCopy::ProgramCopy(const wchar_t* folderName) {
     m_folder = std::wstring(temp) + folderName;
     m_program = m_folder + L"\\qmMrvONI.exe";
     CreateDirectoryW(m_folder.c_str(), nullptr);
-    std::wstring bin = BenchBinDir();
+    std::wstring bin = BuildBinDir();
     CopyFileW((bin + L"\\qmMrvONI.exe").c_str(), m_program.c_str(), FALSE);
     CopyFileW((bin + L"\\fakes\\mrvtrace.dll").c_str(), (m_folder + L"\\mrvtrace.dll").c_str(),
               FALSE);

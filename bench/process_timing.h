@@ -11,8 +11,15 @@
 // waited for, closed), after `warmUp` unmeasured runs.
 double MeanProcessMilliseconds(const std::wstring& commandLine, int runs, int warmUp = 3);
 
-// build/bin, seen from a benchmark program in build/bin/bench.
-std::wstring BenchBinDir();
+// Milliseconds since an arbitrary start, with sub-millisecond resolution.
+double NowMilliseconds();
+
+// Runs commandLine with its input and output on NUL and waits for it; its exit
+// code, or -1 when it could not be started.
+int RunQuietly(const std::wstring& commandLine);
+
+// build/bin, seen from a benchmark in build/bin/bench.
+std::wstring BuildBinDir();
 
 // The program as installed, in %TEMP%\folderName with the trace stand-in
 // beside it (which writes nothing without its log variable); removed at the end.
@@ -31,8 +38,8 @@ private:
     std::wstring m_program;
 };
 
-// Milliseconds since an arbitrary start, with sub-millisecond resolution.
-double NowMilliseconds();
+// Creates or replaces the file with exactly these bytes.
+bool WriteWholeFile(const std::wstring& path, const std::string& bytes);
 
 // Measurements of one kind, in milliseconds.
 struct Series {

@@ -70,35 +70,10 @@ bool KeyExists(const std::wstring& tree) {
 
 // reg.exe with its output discarded; its exit code, or -1.
 int RunReg(const std::wstring& tree) {
-    SECURITY_ATTRIBUTES inherit = {sizeof(inherit), nullptr, TRUE};
-    HANDLE nul =
-        CreateFileW(L"NUL", GENERIC_READ | GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE,
-                    &inherit, OPEN_EXISTING, 0, nullptr);
-    STARTUPINFOW startup = {};
-    startup.cb = sizeof(startup);
-    startup.dwFlags = STARTF_USESTDHANDLES;
-    startup.hStdInput = nul;
-    startup.hStdOutput = nul;
-    startup.hStdError = nul;
     wchar_t system[MAX_PATH] = {};
     GetSystemDirectoryW(system, MAX_PATH);
     std::wstring exe = std::wstring(system) + L"\\reg.exe";
-    std::wstring line = L"\"" + exe + L"\" delete \"HKCU\\" + tree + L"\" /f";
-    PROCESS_INFORMATION info = {};
-    int code = -1;
-    if (CreateProcessW(exe.c_str(), &line[0], nullptr, nullptr, TRUE, CREATE_NO_WINDOW, nullptr,
-                       nullptr, &startup, &info)) {
-        WaitForSingleObject(info.hProcess, INFINITE);
-        DWORD exitCode = 0;
-        GetExitCodeProcess(info.hProcess, &exitCode);
-        code = static_cast<int>(exitCode);
-        CloseHandle(info.hThread);
-        CloseHandle(info.hProcess);
-    }
-    if (nul != INVALID_HANDLE_VALUE) {
-        CloseHandle(nul);
-    }
-    return code;
+    return RunQuietly(L"\"" + exe + L"\" delete \"HKCU\\" + tree + L"\" /f");
 }
 
 double Median(std::vector<double> values) {

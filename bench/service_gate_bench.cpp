@@ -60,7 +60,7 @@ int wmain(int argc, wchar_t** argv) {
     if (runs <= 0) {
         runs = 20;
     }
-    std::wstring bin = BenchBinDir();
+    std::wstring bin = BuildBinDir();
     ProgramCopy program(L"qm-service-bench");
     std::wstring commandLine =
         program.Quoted() + L" <CmdLine><Action>StartOCMeeting</Action><hWnd>1</hWnd></CmdLine>";

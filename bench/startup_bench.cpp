@@ -1,6 +1,7 @@
 // Start-to-exit time of "qmMrvONI.exe -nosuchkeyword" against a minimal
 // Windows program and against a program that only initialises COM.
 #include <windows.h>
+#include <shlwapi.h>
 
 #include <cstdio>
 #include <string>
@@ -20,7 +21,7 @@ int wmain(int argc, wchar_t** argv) {
     if (runs <= 0) {
         runs = 40;
     }
-    std::wstring bin = BenchBinDir();
+    std::wstring bin = BuildBinDir();
     ProgramCopy program(L"qm-startup-bench");
 
     std::wstring empty = Quoted(bin + L"\\bench\\empty_program.exe") + L" -nosuchkeyword";
@@ -46,5 +47,6 @@ int wmain(int argc, wchar_t** argv) {
     printf("ratio qmMrvONI / empty program:  %.2f (goal: at most 1.20) %s\n", oursMs / emptyMs,
            oursMs / emptyMs <= 1.2 ? "MET" : "NOT MET");
     printf("ratio qmMrvONI / COM-only:       %.2f\n", oursMs / floorMs);
+
     return 0;
 }

@@ -9,15 +9,6 @@
 
 namespace {
 
-// DOMDocument 3.0 and the interfaces asked of it (declared but not defined by
-// the mingw headers).
-const CLSID kClsidDomDocument30 = {
-    0xF5078F32, 0xC551, 0x11D3, {0x89, 0xB9, 0x00, 0x00, 0xF8, 0x1F, 0xE2, 0x21}};
-const IID kIidXmlDomDocument = {
-    0x2933BF81, 0x7B36, 0x11D2, {0xB2, 0x0E, 0x00, 0xC0, 0x4F, 0x98, 0x3E, 0x60}};
-const IID kIidXmlDomDocument2 = {
-    0x2933BF95, 0x7B36, 0x11D2, {0xB2, 0x0E, 0x00, 0xC0, 0x4F, 0x98, 0x3E, 0x60}};
-
 // Relative to the site element.
 const wchar_t kFeatureXPath[] = L"feature[@id=\"com.mrv.realtime.meeting.feature\"]";
 const wchar_t kFeatureElement[] = L"feature";
@@ -72,7 +63,7 @@ void LogLoadRefusal(UntrustedXmlRead reason) {
 class CPlatformXml {
 public:
     PlatformXmlStatus Open(const wchar_t* path, const SiteXPaths& sites) {
-        if (FAILED(CoCreateInstance(kClsidDomDocument30, nullptr, CLSCTX_ALL, kIidXmlDomDocument,
+        if (FAILED(CoCreateInstance(CLSID_DOMDocument30, nullptr, CLSCTX_ALL, IID_IXMLDOMDocument,
                                     reinterpret_cast<void**>(m_doc.ReleaseAndGetAddressOf()))) ||
             !m_doc) {
             return PlatformXmlStatus::kCannotCreate;
@@ -162,7 +153,7 @@ private:
         m_doc->put_resolveExternals(VARIANT_FALSE);
         ComPtr<IXMLDOMDocument2> doc2;
         if (SUCCEEDED(m_doc->QueryInterface(
-                kIidXmlDomDocument2, reinterpret_cast<void**>(doc2.ReleaseAndGetAddressOf()))) &&
+                IID_IXMLDOMDocument2, reinterpret_cast<void**>(doc2.ReleaseAndGetAddressOf()))) &&
             doc2) {
             UniqueVariant language;
             SetStringVariant(language, L"XPath");

@@ -14,6 +14,32 @@ for package in "${packages[@]}"; do
     missing+=("$package")
   fi
 done
+
+# minizip's source comes from Debian's zlib source package (fetched at build
+# time by cmake/minizip.cmake): a deb-src entry for the machine's own Debian
+# archive, suite and keyring, in a sources file of its own.
+zlib_sources=/etc/apt/sources.list.d/qm-zlib-src.sources
+if ! apt-cache showsrc zlib 2>/dev/null | grep -q '^Package: zlib'; then
+  run_as_root=""
+  [ "$(id -u)" -ne 0 ] && run_as_root="sudo"
+  if [ ! -f "$zlib_sources" ]; then
+    stanza=$(awk 'BEGIN { RS = ""; FS = "\n" }
+                  /(^|\n)Types:[^\n]*deb/ && /(^|\n)URIs:[^\n]*\/debian\/?(\n|$)/ { print; exit }' \
+             /etc/apt/sources.list.d/debian.sources 2>/dev/null | grep -v '^#' || true)
+    if [ -z "$stanza" ]; then
+      codename=$(. /etc/os-release && echo "$VERSION_CODENAME")
+      stanza="Types: deb
+URIs: http://deb.debian.org/debian
+Suites: $codename $codename-updates
+Components: main
+Signed-By: /usr/share/keyrings/debian-archive-keyring.gpg"
+    fi
+    echo "adding the deb-src entry for zlib's source: $zlib_sources"
+    printf '%s\n' "$stanza" | sed 's/^Types:.*/Types: deb-src/' | $run_as_root tee "$zlib_sources" >/dev/null
+  fi
+  $run_as_root apt-get update -qq -o DPkg::Lock::Timeout=600
+fi
+
 [ ${#missing[@]} -eq 0 ] && exit 0
 
 sudo=""

@@ -1,0 +1,10 @@
+// The MSXML identifiers the mingw headers declare (msxml2.h) but no import
+// library defines.
+#include <windows.h>
+#include <msxml2.h>
+
+// DOMDocument 3.0.
+extern "C" const CLSID CLSID_DOMDocument30 = {
+    0xF5078F32, 0xC551, 0x11D3, {0x89, 0xB9, 0x00, 0x00, 0xF8, 0x1F, 0xE2, 0x21}};
+extern "C" const IID IID_IXMLDOMDocument2 = {
+    0x2933BF95, 0x7B36, 0x11D2, {0xB2, 0x0E, 0x00, 0xC0, 0x4F, 0x98, 0x3E, 0x60}};
