@@ -121,12 +121,12 @@ TEST_F(ServiceGateTest, CommonLoginSendsItsFieldsInOrderWithParentWindowZero) {
 
 class SettingsDialogTest
     : public ServiceGateTest,
-      public ::testing::WithParamInterface<std::pair<const wchar_t*, const char*>> {};
+      public ::testing::WithParamInterface<std::pair<const wchar_t*, std::vector<std::string>>> {};
 
 TEST_P(SettingsDialogTest, OpensTheDialogAndPumpsUntilItIsClosed) {
     Run("SettingDlgOpenMs=1200\n", GetParam().first);
     std::string document = OnlyDocument("OpenSettingDlg");
-    EXPECT_NE(std::string::npos, document.find(GetParam().second)) << document;
+    EXPECT_TRUE(InOrder(document, GetParam().second)) << document;
     std::vector<ServiceEntry> polls = m_service.Calls("IsSettingDlgOpened");
     ASSERT_FALSE(polls.empty());
     EXPECT_GE(CallTime(polls.back()) - m_service.TimeOf("call", "OpenSettingDlg"), 1200);
@@ -136,10 +136,13 @@ TEST_P(SettingsDialogTest, OpensTheDialogAndPumpsUntilItIsClosed) {
 INSTANTIATE_TEST_SUITE_P(
     WithAndWithoutSite, SettingsDialogTest,
     ::testing::Values(
-        std::make_pair(L"<CmdLine><Action>OpenQMSetting</Action></CmdLine>", "(null)"),
+        std::make_pair(L"<CmdLine><Action>OpenQMSetting</Action></CmdLine>",
+                       std::vector<std::string>{"(null)"}),
         std::make_pair(L"<CmdLine><Action>OpenQMSetting</Action><SiteUrl>https://b.example"
                        L"</SiteUrl></CmdLine>",
-                       "<SwitchSite><SiteUrl>https://b.example</SiteUrl></SwitchSite>")));
+                       std::vector<std::string>{"<SwitchSite>",
+                                                "<SiteUrl>https://b.example</SiteUrl>",
+                                                "</SwitchSite>"})));
 
 TEST_F(ServiceGateTest, ServiceEndingWhileTheDialogIsOpenEndsThePump) {
     RunResult run = Run("SettingDlgOpenMs=600000\nExitAfter=OpenSettingDlg 300\n",

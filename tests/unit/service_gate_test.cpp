@@ -1,18 +1,41 @@
-// The Suite service gate's rules that no command line reaches, checked in
-// this process against the stand-in service (out of process): the busy flag
-// of a wrapper called again from inside an event, and the client kinds that
-// send no request.
+// The Suite service gate's rules that no command line shows, checked in this
+// process: the login answer's reading, and against the stand-in service (out
+// of process) the busy flag of a wrapper called again from inside an event
+// and the client kinds that send no request.
 #include <windows.h>
 #include <gtest/gtest.h>
 
 #include <functional>
 
 #include "actions/service_gate.h"
+#include "actions/service_requests.h"
 #include "tests/fakes/qmsrv/stand_in_control.h"
+#include "tests/support/file_util.h"
 #include "tests/support/scratch_dir.h"
 #include "tests/support/test_paths.h"
 
 namespace {
+
+TEST(LoginAnswer, SucceedsWhenTheResultBeginsWithSuccessInAnyCase) {
+    CoInitialize(nullptr);
+    const struct {
+        const wchar_t* result;  // null: no LoginResult element
+        int success;
+    } rows[] = {{L"SUCCESS", 1}, {L"successful", 1}, {L"succes", 0}, {L"fail", 0}, {nullptr, 0}};
+    for (const auto& row : rows) {
+        std::wstring text =
+            L"<Mirovan_QM><Func_Params>" +
+            (row.result ? L"<LoginResult>" + std::wstring(row.result) + L"</LoginResult>"
+                        : std::wstring(L"<Other>success</Other>")) +
+            L"</Func_Params></Mirovan_QM>";
+        UniqueBstr response(SysAllocString(text.c_str()));
+        EXPECT_EQ(row.success, ReadLoginResult(response.get())) << Narrow(text);
+    }
+    UniqueBstr notXml(SysAllocString(L"success"));
+    EXPECT_EQ(0, ReadLoginResult(notXml.get()));
+    EXPECT_EQ(0, ReadLoginResult(nullptr));
+    CoUninitialize();
+}
 
 class GateInProcessTest : public ::testing::Test {
 protected:
