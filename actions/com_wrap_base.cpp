@@ -35,6 +35,12 @@ bool CComWrapBase::CreateInstance() {
     if (m_autoAdvise) {
         AdviseOwnSink();
     }
+    // Sinks kept from an object that could not be re-created follow this one.
+    for (AdvisedSink& entry : m_sinks) {
+        if (entry.sink != &m_ownSink) {
+            Connect(entry);
+        }
+    }
     return true;
 }
 

@@ -41,7 +41,8 @@ public:
     IDispatch* Object() const { return m_object.Get(); }
 
     // Creates the object unless one is held; a failure logs "CreateInstance
-    // fail" with "hr". With the auto-advise flag the own sink is connected.
+    // fail" with "hr". With the auto-advise flag the own sink is connected;
+    // so are the other sinks still listed.
     bool CreateInstance();
     // Connects sink to the object's events and keeps it connected across a
     // re-creation; the result of the connection.
