@@ -17,22 +17,6 @@
 
 namespace {
 
-double RunToExit(const std::wstring& commandLine) {
-    std::wstring line = commandLine;
-    STARTUPINFOW startup = {};
-    startup.cb = sizeof(startup);
-    PROCESS_INFORMATION process = {};
-    if (!CreateProcessW(nullptr, &line[0], nullptr, nullptr, FALSE, 0, nullptr, nullptr, &startup,
-                        &process)) {
-        return -1;
-    }
-    WaitForSingleObject(process.hProcess, INFINITE);
-    double end = NowMilliseconds();
-    CloseHandle(process.hThread);
-    CloseHandle(process.hProcess);
-    return end;
-}
-
 void Measure(ServiceStandIn& service, const std::wstring& commandLine, int runs, bool cold,
              Series& firstCall, Series& eventToExit) {
     for (int i = 0; i < runs; ++i) {
@@ -41,10 +25,11 @@ void Measure(ServiceStandIn& service, const std::wstring& commandLine, int runs,
             ServiceStandIn::WaitForServersToEnd();
         }
         double start = NowMilliseconds();
-        double end = RunToExit(commandLine);
+        int exitCode = RunQuietly(commandLine);
+        double end = NowMilliseconds();
         double call = service.TimeOf("call", "HasValidAccount");
         double event = service.TimeOf("event", "Meeting.96");
-        if (end < 0 || call < 0 || event < 0) {
+        if (exitCode != 0 || call < 0 || event < 0) {
             printf("  run %d: no call or event reached the service\n", i);
             continue;
         }
