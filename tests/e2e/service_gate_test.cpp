@@ -1,11 +1,71 @@
-// Actions 3, 4, 6 and 8 through the Suite service: what reaches the service
-// (calls and documents), which events end the wait, the retry after a failed
-// call, and hostile answers.
-#include <cstdlib>
+// Actions 3, 4, 6 and 8 through the Suite service, registered in the test's
+// prefix as an out-of-process COM server: what reaches the service (calls and
+// documents), which events end the wait, the retry after a failed call,
+// hostile answers, and (ServiceGateSlow, labelled slow) the watchdog ending
+// a wait that no event ends after 90 s or 120 s.
+#include <windows.h>
+#include <gtest/gtest.h>
 
-#include "tests/e2e/service_gate_fixture.h"
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+#include "tests/fakes/qmsrv/fake_script.h"
+#include "tests/fakes/qmsrv/stand_in_control.h"
+#include "tests/support/program_run.h"
+#include "tests/support/scratch_dir.h"
+#include "tests/support/test_paths.h"
 
 namespace {
+
+class ServiceGateTest : public ::testing::Test {
+protected:
+    void SetUp() override {
+        ASSERT_TRUE(m_service.registered());
+        m_program.SetEnv(L"QM_FAKE_QMSRV_SCRIPT", m_service.scriptPath());
+        m_program.SetEnv(L"QM_FAKE_QMSRV_LOG", m_service.logPath());
+    }
+
+    // Runs the command line with the script; m_endMs is when it ended.
+    RunResult Run(const std::string& script, const std::wstring& commandLine,
+                  DWORD timeoutMs = 60000) {
+        m_service.SetScript(script);
+        m_startMs = fake::CounterMs();
+        RunResult run = m_program.Run(commandLine, timeoutMs);
+        m_endMs = fake::CounterMs();
+        ServiceStandIn::WaitForServersToEnd();
+        EXPECT_FALSE(run.crashed);
+        EXPECT_FALSE(run.timedOut);
+        EXPECT_EQ(0, run.exitCode);
+        return run;
+    }
+
+    // The document of the only call of method.
+    std::string OnlyDocument(const std::string& method) const {
+        std::vector<ServiceEntry> calls = m_service.Calls(method);
+        EXPECT_EQ(1u, calls.size()) << method;
+        return calls.size() == 1 && calls[0].args.size() == 2 ? calls[0].args[0] : std::string();
+    }
+
+    ScratchDir m_scratch{L"gate"};
+    ProgramUnderTest m_program{m_scratch.Sub(L"bin")};
+    ServiceStandIn m_service{FakePath(L"qmSrv.exe"), m_scratch.Sub(L"service", true)};
+    double m_startMs = 0;
+    double m_endMs = 0;
+};
+
+// True when the parts occur in text in this order.
+bool InOrder(const std::string& text, const std::vector<std::string>& parts) {
+    size_t at = 0;
+    for (const std::string& part : parts) {
+        at = text.find(part, at);
+        if (at == std::string::npos) {
+            return false;
+        }
+        at += part.size();
+    }
+    return true;
+}
 
 const wchar_t kStartMeeting[] =
     L"<CmdLine><Action>StartOCMeeting</Action><Client>NI</Client><hWnd>1234</hWnd></CmdLine>";
@@ -194,5 +254,26 @@ INSTANTIATE_TEST_SUITE_P(
                       "</Func_Params><Func_Params><UserName/></Func_Params></Mirovan_QM>\n"
                       "LoginResponse=<LoginResult>success</LoginResult>\n",
                       "AccountInfoResult=1\n"));
+
+class ServiceGateSlow : public ServiceGateTest {};
+
+TEST_F(ServiceGateSlow, ServiceEndingDuringTheMeetingWaitLeavesItToTheWatchdog) {
+    RunResult run =
+        Run("ExitAfter=StartOCMeeting 300\n",
+            L"<CmdLine><Action>StartOCMeeting</Action><hWnd>1</hWnd></CmdLine>", 150000);
+    EXPECT_GE(m_endMs - m_service.TimeOf("call", "StartOCMeeting"), 89500);
+    EXPECT_LT(m_endMs - m_startMs, 110000);
+    // The disclaimer question after the wait reached a new service process.
+    EXPECT_TRUE(run.HasTrace(" ReCreateInstance Success, qmSrv Recover success,\n"));
+}
+
+TEST_F(ServiceGateSlow, ShareWithoutAnEventEndsAfterTwoMinutes) {
+    Run("",
+        L"<CmdLine><Action>ShareAsApp</Action><SharePathFile>C:\\a.exe</SharePathFile>"
+        L"<ShareFlag>1</ShareFlag></CmdLine>",
+        170000);
+    EXPECT_GE(m_endMs - m_service.TimeOf("call", "StartOCMeeting"), 119500);
+    EXPECT_LT(m_endMs - m_startMs, 140000);
+}
 
 }  // namespace
