@@ -74,12 +74,9 @@ int wmain(int argc, wchar_t** argv) {
         std::printf("COM could not be initialised\n");
         return 1;
     }
-    wchar_t temp[MAX_PATH] = {};
-    GetTempPathW(MAX_PATH, temp);
-    const std::wstring folder = std::wstring(temp) + L"qm-custom-status-bench";
+    const std::wstring folder = MakeScratchFolder(L"qm-custom-status-bench");
     const std::wstring path = folder + L"\\status.xml";
     const std::wstring templatePath = folder + L"\\MirovanStatus.xml";
-    CreateDirectoryW(folder.c_str(), nullptr);
     const std::string original = BigStatusFile();
     if (!CopyFileW((BuildBinDir() + L"\\fakes\\MirovanStatus.xml").c_str(), templatePath.c_str(),
                    FALSE) ||

@@ -90,3 +90,11 @@ bool WriteWholeFile(const std::wstring& path, const std::string& bytes) {
     CloseHandle(file);
     return ok && written == bytes.size();
 }
+
+std::wstring MakeScratchFolder(const wchar_t* name) {
+    wchar_t temp[MAX_PATH] = {};
+    GetTempPathW(MAX_PATH, temp);
+    std::wstring folder = std::wstring(temp) + name;
+    CreateDirectoryW(folder.c_str(), nullptr);
+    return folder;
+}

@@ -21,6 +21,9 @@ int RunQuietly(const std::wstring& commandLine);
 // build/bin, seen from a benchmark in build/bin/bench.
 std::wstring BuildBinDir();
 
+// The folder name in the temporary folder, created when missing.
+std::wstring MakeScratchFolder(const wchar_t* name);
+
 // Creates or replaces the file with exactly these bytes.
 bool WriteWholeFile(const std::wstring& path, const std::string& bytes);
 
