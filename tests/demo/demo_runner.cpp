@@ -4,13 +4,17 @@
 // Each further argument is one command line after the program name; "{caller}"
 // in it stands for the handle of a window of the runner's that prints the
 // WM_COPYDATA messages it receives, as a calling suite program would get them.
+// When QM_DEMO_AWAIT names executables (separated by ";"), the programs the
+// run started under those names are waited for, so their records show too.
 #include <windows.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <string>
 
 #include "tests/fakes/caller/feedback_receiver.h"
 #include "tests/support/file_util.h"
+#include "tests/support/process_wait.h"
 #include "tests/support/program_run.h"
 
 namespace {
@@ -27,6 +31,18 @@ void PrintRecordText(const std::string& text) {
         }
     }
     printf("%s", shown.c_str());
+}
+
+void AwaitStartedPrograms() {
+    wchar_t names[1024] = {};
+    if (GetEnvironmentVariableW(L"QM_DEMO_AWAIT", names, 1024) >= 1024) {
+        return;
+    }
+    std::wstring list = names;
+    for (size_t start = 0, end; start < list.size(); start = end + 1) {
+        end = std::min(list.find(L';', start), list.size());
+        AwaitProcessesNamed(list.substr(start, end - start).c_str(), 120000);
+    }
 }
 
 }  // namespace
@@ -52,6 +68,7 @@ int wmain(int argc, wchar_t** argv) {
         RunAsDebuggee(L"\"" + program + L"\" " + arguments,
                       BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", traceLog}}), folder, 120000,
                       &run);
+        AwaitStartedPrograms();
         for (const TraceRecord& record : ParseTraceLog(ReadFileBytes(traceLog))) {
             printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
             PrintRecordText(record.text);

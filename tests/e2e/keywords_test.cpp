@@ -86,16 +86,4 @@ TEST_F(KeywordsTest, EachKeywordLogsItsStartMessageAndEndsWithItsResult) {
     }
 }
 
-TEST_F(KeywordsTest, TemporaryUpdateCopyWithoutItsWindowEndsWithZero) {
-    // Started under the temporary copy's name, "nupdate" enters update mode;
-    // without its hidden window there is no self-update and the result is 0.
-    ProgramOptions options;
-    options.exeName = L"~MRVONI.EXE";
-    ProgramUnderTest copy(m_scratch.Sub(L"copy"), options);
-    RunResult run = copy.Run(L"-nupdate");
-    EXPECT_FALSE(run.crashed);
-    EXPECT_FALSE(run.timedOut);
-    EXPECT_EQ(0, run.exitCode);
-}
-
 }  // namespace
