@@ -98,3 +98,18 @@ std::wstring MakeScratchFolder(const wchar_t* name) {
     CreateDirectoryW(folder.c_str(), nullptr);
     return folder;
 }
+
+ProgramCopy::ProgramCopy(const wchar_t* folderName)
+    : m_folder(MakeScratchFolder(folderName)), m_program(m_folder + L"\\qmMrvONI.exe") {
+    std::wstring bin = BuildBinDir();
+    CopyFileW((bin + L"\\qmMrvONI.exe").c_str(), m_program.c_str(), FALSE);
+    CopyFileW((bin + L"\\fakes\\mrvtrace.dll").c_str(), (m_folder + L"\\mrvtrace.dll").c_str(),
+              FALSE);
+    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);
+}
+
+ProgramCopy::~ProgramCopy() {
+    DeleteFileW(m_program.c_str());
+    DeleteFileW((m_folder + L"\\mrvtrace.dll").c_str());
+    RemoveDirectoryW(m_folder.c_str());
+}
