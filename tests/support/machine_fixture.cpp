@@ -17,8 +17,12 @@ const wchar_t kUninstallKey[] = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\
 
 void ClearProductState() {
     for (REGSAM view : {REGSAM(0), REGSAM(KEY_WOW64_64KEY)}) {
-        for (const wchar_t* key : {L"SOFTWARE\\Mirovan", L"SOFTWARE\\Lotus",
-                                   L"SOFTWARE\\Citrix\\Citrix Management Console"}) {
+        for (const wchar_t* key :
+             {L"SOFTWARE\\Mirovan", L"SOFTWARE\\Lotus",
+              L"SOFTWARE\\Citrix\\Citrix Management Console",
+              L"SOFTWARE\\Classes\\CLSID\\{A12A21B3-CFDA-497E-98C0-CE60D4D108C8}",
+              L"Software\\Policies\\Microsoft\\Communicator",
+              L"Software\\Policies\\Microsoft\\Office\\15.0\\Lync"}) {
             RegRemoveTree(HKEY_LOCAL_MACHINE, key, view);
         }
         for (const wchar_t* key :
@@ -27,7 +31,10 @@ void ClearProductState() {
               L"{0A4C50AC-AD3F-4245-B324-3C8696A3408A}",
               L"SOFTWARE\\Classes\\MrvRMenu.MirovanRightMenu",
               L"SOFTWARE\\Classes\\MrvRMenu.MirovanRightMenu.1",
-              L"SOFTWARE\\Classes\\*\\shellex\\ContextMenuHandlers\\MirovanShareMenu"}) {
+              L"SOFTWARE\\Classes\\*\\shellex\\ContextMenuHandlers\\MirovanShareMenu",
+              L"Software\\Policies\\Microsoft\\Communicator",
+              L"Software\\Policies\\Microsoft\\Office\\15.0\\Lync",
+              L"Software\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\QuillmarkTools"}) {
             RegRemoveTree(HKEY_CURRENT_USER, key, view);
         }
         HKEY uninstall = nullptr;
@@ -56,11 +63,18 @@ void ClearProductState() {
     for (const wchar_t* folder : {L"Lotus", L"IBM", L"Mirovan"}) {
         RemoveTree(JoinPath(RoamingAppData(), folder));
     }
+    RemoveTree(JoinPath(CommonAppData(), L"Mirovan"));
 }
 
 std::wstring RoamingAppData() {
     wchar_t path[MAX_PATH] = {};
     SHGetFolderPathW(nullptr, CSIDL_APPDATA | CSIDL_FLAG_CREATE, nullptr, SHGFP_TYPE_CURRENT, path);
+    return path;
+}
+
+std::wstring CommonAppData() {
+    wchar_t path[MAX_PATH] = {};
+    SHGetFolderPathW(nullptr, CSIDL_COMMON_APPDATA, nullptr, SHGFP_TYPE_CURRENT, path);
     return path;
 }
 

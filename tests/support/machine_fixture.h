@@ -23,6 +23,8 @@ extern const wchar_t kTestUninstallPrefix[];
 void ClearProductState();
 // The user's roaming application-data folder of this prefix.
 std::wstring RoamingAppData();
+// The all-users application-data folder of this prefix.
+std::wstring CommonAppData();
 
 class MachineTest : public ::testing::Test {
 protected:

@@ -4,7 +4,7 @@
 #include <windows.h>
 #include <gtest/gtest.h>
 
-#include "notes/untrusted_xml_bytes.h"
+#include "base/untrusted_xml_bytes.h"
 #include "tests/support/file_util.h"
 #include "tests/support/scratch_dir.h"
 
