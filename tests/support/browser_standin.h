@@ -1,10 +1,8 @@
 // Puts the browser stand-in (build/bin/fakes/iexplore*) in the place of
-// Internet Explorer's class in both registry views while the object lives,
-// then puts back what was there. Its page comes from a page script (see
-// tests/fakes/browser/page_script.h), its calls go to a log of their own.
+// Internet Explorer's class in both registry views while the object lives.
+// Its page comes from a page script (tests/fakes/browser/page_script.h).
 #pragma once
 
-#include <memory>
 #include <string>
 
 #include "tests/support/registry_util.h"
@@ -22,7 +20,7 @@ public:
     BrowserStandIn(const BrowserStandIn&) = delete;
     BrowserStandIn& operator=(const BrowserStandIn&) = delete;
 
-    // Writes the page script (and empties the calls log).
+    // Writes the page script and empties the log of the browser's calls.
     void SetPage(const std::string& lines) const;
     std::string Calls() const;
 
