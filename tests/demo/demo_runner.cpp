@@ -6,6 +6,8 @@
 // WM_COPYDATA messages it receives, as a calling suite program would get them.
 // When QM_DEMO_AWAIT names executables (separated by ";"), the programs the
 // run started under those names are waited for, so their records show too.
+//   demo_runner.exe --trace <trace log>
+// prints the records of runs started by others (an installer's custom actions).
 #include <windows.h>
 
 #include <algorithm>
@@ -33,6 +35,14 @@ void PrintRecordText(const std::string& text) {
     printf("%s", shown.c_str());
 }
 
+void PrintRecords(const std::wstring& traceLog) {
+    for (const TraceRecord& record : ParseTraceLog(ReadFileBytes(traceLog))) {
+        printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
+        PrintRecordText(record.text);
+        printf("\n");
+    }
+}
+
 void AwaitStartedPrograms() {
     wchar_t names[1024] = {};
     if (GetEnvironmentVariableW(L"QM_DEMO_AWAIT", names, 1024) >= 1024) {
@@ -48,6 +58,10 @@ void AwaitStartedPrograms() {
 }  // namespace
 
 int wmain(int argc, wchar_t** argv) {
+    if (argc == 3 && std::wstring(argv[1]) == L"--trace") {
+        PrintRecords(argv[2]);
+        return 0;
+    }
     if (argc < 3) {
         fprintf(stderr, "usage: demo_runner <program folder> <arguments>...\n");
         return 2;
@@ -69,11 +83,7 @@ int wmain(int argc, wchar_t** argv) {
                       BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", traceLog}}), folder, 120000,
                       &run);
         AwaitStartedPrograms();
-        for (const TraceRecord& record : ParseTraceLog(ReadFileBytes(traceLog))) {
-            printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
-            PrintRecordText(record.text);
-            printf("\n");
-        }
+        PrintRecords(traceLog);
         std::vector<CopyData> messages = caller.Received();
         for (size_t m = received; m < messages.size(); ++m) {
             printf("  WM_COPYDATA to the caller: %s\n", Narrow(messages[m].text).c_str());
