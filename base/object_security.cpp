@@ -31,6 +31,15 @@ const wchar_t* HiveName(HKEY root) {
     return nullptr;
 }
 
+// Taking ownership lets an administrator read descriptors it could not
+// otherwise; without the privilege the check still runs. Once enabled it
+// stays enabled for the process, so the token is adjusted only once (the
+// profile cleanup builds one of these objects for every user's hive).
+void EnableTakeOwnership() {
+    static const bool enabled = EnablePrivilege(L"SeTakeOwnershipPrivilege");
+    (void)enabled;
+}
+
 GENERIC_MAPPING MappingFor(SE_OBJECT_TYPE type) {
     if (type == SE_FILE_OBJECT) {
         return GENERIC_MAPPING{0x120089, 0x120116, 0x1200A0, 0x1F01FF};
@@ -41,9 +50,7 @@ GENERIC_MAPPING MappingFor(SE_OBJECT_TYPE type) {
 }  // namespace
 
 CObjectSecurity::CObjectSecurity(const wchar_t* filePath) {
-    // Taking ownership lets an administrator read descriptors it could not
-    // otherwise; without the privilege the check still runs.
-    EnablePrivilege(L"SeTakeOwnershipPrivilege");
+    EnableTakeOwnership();
     if (filePath == nullptr || filePath[0] == L'\0') {
         m_lastError = ERROR_INVALID_PARAMETER;
         return;
@@ -58,7 +65,7 @@ CObjectSecurity::CObjectSecurity(const wchar_t* filePath) {
 }
 
 CObjectSecurity::CObjectSecurity(HKEY root, const wchar_t* subkey) {
-    EnablePrivilege(L"SeTakeOwnershipPrivilege");
+    EnableTakeOwnership();
     const wchar_t* hive = HiveName(root);
     if (hive == nullptr || subkey == nullptr) {
         m_lastError = ERROR_INVALID_PARAMETER;

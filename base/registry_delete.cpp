@@ -7,7 +7,7 @@
 
 #include "base/object_security.h"
 #include "base/proc_address.h"
-#include "base/registry.h"
+#include "base/registry_no_links.h"
 #include "base/string_ex.h"
 #include "base/trace.h"
 #include "base/win_handles.h"
@@ -195,7 +195,6 @@ BOOL RemoveRegKey(const wchar_t* userKeyName, const wchar_t* subkey) {
     }
     CStringEx path;
     path.Format(L"%s\\%s", userKeyName, subkey);
-    CRegistry registry;
     CObjectSecurity security(HKEY_USERS, path.c_str());
     if (!security.CanDelete()) {
         CStringEx line;
@@ -204,7 +203,9 @@ BOOL RemoveRegKey(const wchar_t* userKeyName, const wchar_t* subkey) {
         OutputDebugStringW(line.c_str());
         return FALSE;
     }
-    if (!registry.RecurDeleteKey(HKEY_USERS, path.c_str(), 0)) {
+    // The user owns that hive: a link planted in it must not lead the deletion
+    // out of it.
+    if (!DeleteKeyTreeNoLinks(HKEY_USERS, path.c_str())) {
         OutputDebugStringW(L"CRegistry::RecurDeleteKey RegDeleteKey Failed!");
         return FALSE;
     }
@@ -217,7 +218,6 @@ BOOL RemoveRegValue(const wchar_t* userKeyName, const wchar_t* subkey, const wch
     }
     CStringEx path;
     path.Format(L"%s\\%s", userKeyName, subkey);
-    CRegistry registry;
     CObjectSecurity security(HKEY_USERS, path.c_str());
     if (!security.CanWrite()) {
         CStringEx line;
@@ -226,7 +226,7 @@ BOOL RemoveRegValue(const wchar_t* userKeyName, const wchar_t* subkey, const wch
         OutputDebugStringW(line.c_str());
         return FALSE;
     }
-    if (!DeleteRegValue(HKEY_USERS, path.c_str(), valueName, 0)) {
+    if (!DeleteValueNoLinks(HKEY_USERS, path.c_str(), valueName)) {
         OutputDebugStringW(L"RemoveRegValue::DeleteValue Failed!");
         return FALSE;
     }

@@ -33,6 +33,8 @@ using RegistryTickSource = DWORD (*)();
 void SetRegistryDeleteTickSource(RegistryTickSource source);
 
 // Deletes HKEY_USERS\userKeyName\subkey when the access check allows it.
+// Neither deletion follows a registry link out of the user's hive
+// (DeleteKeyTreeNoLinks, DeleteValueNoLinks).
 BOOL RemoveRegKey(const wchar_t* userKeyName, const wchar_t* subkey);
 // Deletes a value of HKEY_USERS\userKeyName\subkey when allowed.
 BOOL RemoveRegValue(const wchar_t* userKeyName, const wchar_t* subkey, const wchar_t* valueName);

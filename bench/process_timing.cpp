@@ -90,3 +90,22 @@ bool WriteWholeFile(const std::wstring& path, const std::string& bytes) {
     CloseHandle(file);
     return ok && written == bytes.size();
 }
+
+ProgramCopy::ProgramCopy(const wchar_t* folderName) {
+    wchar_t temp[MAX_PATH] = {};
+    GetTempPathW(MAX_PATH, temp);
+    m_folder = std::wstring(temp) + folderName;
+    m_program = m_folder + L"\\qmMrvONI.exe";
+    CreateDirectoryW(m_folder.c_str(), nullptr);
+    std::wstring bin = BuildBinDir();
+    CopyFileW((bin + L"\\qmMrvONI.exe").c_str(), m_program.c_str(), FALSE);
+    CopyFileW((bin + L"\\fakes\\mrvtrace.dll").c_str(), (m_folder + L"\\mrvtrace.dll").c_str(),
+              FALSE);
+    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);
+}
+
+ProgramCopy::~ProgramCopy() {
+    DeleteFileW(m_program.c_str());
+    DeleteFileW((m_folder + L"\\mrvtrace.dll").c_str());
+    RemoveDirectoryW(m_folder.c_str());
+}

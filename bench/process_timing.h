@@ -21,6 +21,23 @@ int RunQuietly(const std::wstring& commandLine);
 // build/bin, seen from a benchmark in build/bin/bench.
 std::wstring BuildBinDir();
 
+// The program as installed, in %TEMP%\folderName with the trace stand-in
+// beside it (which writes nothing without its log variable); removed at the end.
+class ProgramCopy {
+public:
+    explicit ProgramCopy(const wchar_t* folderName);
+    ~ProgramCopy();
+    ProgramCopy(const ProgramCopy&) = delete;
+    ProgramCopy& operator=(const ProgramCopy&) = delete;
+    const std::wstring& folder() const { return m_folder; }
+    // The program's path in quotes, for a command line.
+    std::wstring Quoted() const { return L"\"" + m_program + L"\""; }
+
+private:
+    std::wstring m_folder;
+    std::wstring m_program;
+};
+
 // Creates or replaces the file with exactly these bytes.
 bool WriteWholeFile(const std::wstring& path, const std::string& bytes);
 

@@ -22,21 +22,11 @@ int wmain(int argc, wchar_t** argv) {
         runs = 40;
     }
     std::wstring bin = BuildBinDir();
-    // The program as installed: with its trace library beside it (the
-    // stand-in writes nothing without its log variable).
-    wchar_t temp[MAX_PATH] = {};
-    GetTempPathW(MAX_PATH, temp);
-    std::wstring folder = std::wstring(temp) + L"qm-startup-bench";
-    CreateDirectoryW(folder.c_str(), nullptr);
-    std::wstring program = folder + L"\\qmMrvONI.exe";
-    CopyFileW((bin + L"\\qmMrvONI.exe").c_str(), program.c_str(), FALSE);
-    CopyFileW((bin + L"\\fakes\\mrvtrace.dll").c_str(), (folder + L"\\mrvtrace.dll").c_str(),
-              FALSE);
-    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);
+    ProgramCopy program(L"qm-startup-bench");
 
     std::wstring empty = Quoted(bin + L"\\bench\\empty_program.exe") + L" -nosuchkeyword";
     std::wstring floor = Quoted(bin + L"\\bench\\com_floor_program.exe") + L" -nosuchkeyword";
-    std::wstring ours = Quoted(program) + L" -nosuchkeyword";
+    std::wstring ours = program.Quoted() + L" -nosuchkeyword";
 
     // Interleave rounds so drift of the machine hits all three alike.
     double emptyMs = 0, floorMs = 0, oursMs = 0;
@@ -58,8 +48,5 @@ int wmain(int argc, wchar_t** argv) {
            oursMs / emptyMs <= 1.2 ? "MET" : "NOT MET");
     printf("ratio qmMrvONI / COM-only:       %.2f\n", oursMs / floorMs);
 
-    DeleteFileW(program.c_str());
-    DeleteFileW((folder + L"\\mrvtrace.dll").c_str());
-    RemoveDirectoryW(folder.c_str());
     return 0;
 }

@@ -43,13 +43,30 @@ void ClearOldRMenuReg() {
     CRegistry::RecurDeleteKey(HKEY_CURRENT_USER, kOldShareMenuKey, 0);
 }
 
-// Filled in with the rest of the legacy component removal.
-void RemoveOldOIInstallFiles() {}
-
 void RemoveOldOIRegistry(HKEY root) {
     TraceLevel1(TraceValue("RemoveOldOIRegistry(HKEY hMainKey)."));
     DeleteRegValue(root, kOldOutlookGeneralKey, L"NoSchedulePermission", 0);
 }
 
-void UnRegisterOldClassIDs() {}
-void RegQM64BitAddin() {}
+void UnRegisterOldClassIDs() {
+    const wchar_t kOldToolbarClass[] = L"{90E2BA2E-DD1B-4cde-9134-7A8B86D33CA7}";
+    const wchar_t* const kRetiredKeys[] = {
+        L"SOFTWARE\\Classes\\CLSID\\{90E2BA2E-DD1B-4cde-9134-7A8B86D33CA7}",
+        L"SOFTWARE\\Classes\\QmOneCli.MrvIEToolbar.1",
+        L"SOFTWARE\\Classes\\QmOneCli.MrvIEToolbar",
+        nullptr,  // the toolbar's value, in its turn
+        L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Explorer\\Browser Helper Objects\\"
+        L"{90E2BA2E-DD1B-4cde-9134-7A8B86D33CA7}",
+        L"SOFTWARE\\Classes\\CLSID\\{0A4C50AC-AD3F-4245-B324-3C8696A3408A}",
+        L"SOFTWARE\\Classes\\QmMrvst.MrvAction.1",
+        L"SOFTWARE\\Classes\\QmMrvst.MrvAction",
+    };
+    for (const wchar_t* key : kRetiredKeys) {
+        if (key == nullptr) {
+            DeleteRegValue(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Microsoft\\Internet Explorer\\Toolbar",
+                           kOldToolbarClass, 0);
+        } else {
+            CRegistry::RecurDeleteKey(HKEY_LOCAL_MACHINE, key, 0);
+        }
+    }
+}

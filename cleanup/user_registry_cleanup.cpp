@@ -23,6 +23,3 @@ void ClearCurUserQMReg() {
     RecursDeleteRegisterKey(root, L"Software\\Mirovan", L"QmkTools");
     DeleteRegValue(root, kRunOnceKey, L"Mirovan_QM", 0);
 }
-
-// Filled in with the per-user registry cleanup of every profile.
-void DeleteAllCurUserReg(const wchar_t*, const wchar_t*, const wchar_t*) {}

@@ -6,6 +6,9 @@
 // WM_COPYDATA messages it receives, as a calling suite program would get them.
 // When QM_DEMO_AWAIT names executables (separated by ";"), the programs the
 // run started under those names are waited for, so their records show too.
+// With QM_DEMO_WATCH_HIVES set to user names (";" between them), it also shows
+// what those users' hives hold under SOFTWARE\Mirovan as the program unloads
+// them (Wine does not write a hive back to its file).
 //   demo_runner.exe --trace <trace log>
 // prints the records of runs started by others (an installer's custom actions).
 #include <windows.h>
@@ -13,8 +16,10 @@
 #include <algorithm>
 #include <cstdio>
 #include <string>
+#include <vector>
 
 #include "tests/fakes/caller/feedback_receiver.h"
+#include "tests/support/entry_stop.h"
 #include "tests/support/file_util.h"
 #include "tests/support/process_wait.h"
 #include "tests/support/program_run.h"
@@ -43,15 +48,48 @@ void PrintRecords(const std::wstring& traceLog) {
     }
 }
 
-void AwaitStartedPrograms() {
+// The names listed in an environment variable (";" between them).
+std::vector<std::wstring> Listed(const wchar_t* variable) {
     wchar_t names[1024] = {};
-    if (GetEnvironmentVariableW(L"QM_DEMO_AWAIT", names, 1024) >= 1024) {
-        return;
+    std::vector<std::wstring> listed;
+    if (GetEnvironmentVariableW(variable, names, 1024) >= 1024) {
+        return listed;
     }
     std::wstring list = names;
     for (size_t start = 0, end; start < list.size(); start = end + 1) {
         end = std::min(list.find(L';', start), list.size());
-        AwaitProcessesNamed(list.substr(start, end - start).c_str(), 120000);
+        listed.push_back(list.substr(start, end - start));
+    }
+    return listed;
+}
+
+void AwaitStartedPrograms() {
+    for (const std::wstring& name : Listed(L"QM_DEMO_AWAIT")) {
+        AwaitProcessesNamed(name.c_str(), 120000);
+    }
+}
+
+// What each watched user's hive holds under SOFTWARE\Mirovan, if loaded.
+void PrintLoadedHives(const std::vector<std::wstring>& users) {
+    for (const std::wstring& user : users) {
+        HKEY mirovan = nullptr;
+        if (RegOpenKeyExW(HKEY_USERS, (user + L"\\SOFTWARE\\Mirovan").c_str(), 0, KEY_READ,
+                          &mirovan) != ERROR_SUCCESS) {
+            continue;
+        }
+        printf("  as the program unloads HKEY_USERS\\%s, SOFTWARE\\Mirovan holds:",
+               Narrow(user).c_str());
+        wchar_t name[256];
+        for (DWORD i = 0;; ++i) {
+            DWORD size = 256;
+            if (RegEnumKeyExW(mirovan, i, name, &size, nullptr, nullptr, nullptr, nullptr) !=
+                ERROR_SUCCESS) {
+                break;
+            }
+            printf(" %s", Narrow(name).c_str());
+        }
+        printf("\n");
+        RegCloseKey(mirovan);
     }
 }
 
@@ -79,9 +117,15 @@ int wmain(int argc, wchar_t** argv) {
         printf("\n$ qmMrvONI.exe %s\n", Narrow(arguments).c_str());
         DeleteFileW(traceLog.c_str());
         RunResult run;
+        const std::vector<std::wstring> users = Listed(L"QM_DEMO_WATCH_HIVES");
+        EntryStop unload(reinterpret_cast<const void*>(
+                             GetProcAddress(GetModuleHandleW(L"advapi32.dll"), "RegUnLoadKeyW")),
+                         [&users] { PrintLoadedHives(users); });
+        DebuggeeHooks hooks;
+        hooks.stop = users.empty() ? nullptr : &unload;
         RunAsDebuggee(L"\"" + program + L"\" " + arguments,
                       BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", traceLog}}), folder, 120000,
-                      &run);
+                      &run, hooks);
         AwaitStartedPrograms();
         PrintRecords(traceLog);
         std::vector<CopyData> messages = caller.Received();

@@ -3,18 +3,14 @@
 #include <windows.h>
 
 #include "tests/support/file_util.h"
+#include "tests/support/host_shell.h"
 
 namespace {
 
-// The quoted host name of a Windows path (UTF-8 from wine_get_unix_file_name).
-std::wstring HostPath(const std::wstring& path) {
-    using ToUnix = char* (*)(const wchar_t*);
-    auto toUnix = reinterpret_cast<ToUnix>(reinterpret_cast<void*>(
-        GetProcAddress(GetModuleHandleW(L"kernel32.dll"), "wine_get_unix_file_name")));
-    char* unix = toUnix != nullptr ? toUnix(path.c_str()) : nullptr;
-    std::wstring host = unix != nullptr ? L"\"" + Widen(unix) + L"\"" : std::wstring();
-    HeapFree(GetProcessHeap(), 0, unix);
-    return host;
+// The quoted host name of a Windows path.
+std::wstring QuotedHostPath(const std::wstring& path) {
+    std::string host = HostPath(path);
+    return host.empty() ? std::wstring() : L"\"" + Widen(host) + L"\"";
 }
 
 bool IsLink(const std::wstring& path) {
@@ -45,14 +41,14 @@ bool RunHost(const wchar_t* program, std::wstring arguments, const std::wstring&
 }  // namespace
 
 HostLink::HostLink(const std::wstring& link, const std::wstring& target) : m_link(link) {
-    std::wstring hostLink = HostPath(link);
-    std::wstring hostTarget = HostPath(target);
+    std::wstring hostLink = QuotedHostPath(link);
+    std::wstring hostTarget = QuotedHostPath(target);
     m_ok = !hostLink.empty() && !hostTarget.empty() &&
            RunHost(L"Z:\\bin\\ln", L"-s -- " + hostTarget + L" " + hostLink, link, true);
 }
 
 HostLink::~HostLink() {
     if (IsLink(m_link)) {
-        RunHost(L"Z:\\bin\\rm", L"-f -- " + HostPath(m_link), m_link, false);
+        RunHost(L"Z:\\bin\\rm", L"-f -- " + QuotedHostPath(m_link), m_link, false);
     }
 }

@@ -4,6 +4,7 @@
 #include <cstdlib>
 #include <cwctype>
 
+#include "tests/support/entry_stop.h"
 #include "tests/support/file_util.h"
 #include "tests/support/test_paths.h"
 
@@ -127,16 +128,23 @@ std::vector<wchar_t> BuildEnvironmentBlock(const std::map<std::wstring, std::wst
 }
 
 void RunAsDebuggee(const std::wstring& commandLine, const std::vector<wchar_t>& environment,
-                   const std::wstring& workingDir, DWORD timeoutMs, RunResult* result) {
+                   const std::wstring& workingDir, DWORD timeoutMs, RunResult* result,
+                   const DebuggeeHooks& hooks) {
     std::vector<wchar_t> mutableLine(commandLine.begin(), commandLine.end());
     mutableLine.push_back(L'\0');
     STARTUPINFOW startup = {};
     startup.cb = sizeof(startup);
     PROCESS_INFORMATION process = {};
-    if (!CreateProcessW(nullptr, mutableLine.data(), nullptr, nullptr, FALSE,
-                        DEBUG_ONLY_THIS_PROCESS | CREATE_UNICODE_ENVIRONMENT,
-                        const_cast<wchar_t*>(environment.data()),
-                        workingDir.empty() ? nullptr : workingDir.c_str(), &startup, &process)) {
+    const DWORD flags = DEBUG_ONLY_THIS_PROCESS | CREATE_UNICODE_ENVIRONMENT;
+    void* block = const_cast<wchar_t*>(environment.data());
+    const wchar_t* folder = workingDir.empty() ? nullptr : workingDir.c_str();
+    BOOL created =
+        hooks.token != nullptr
+            ? CreateProcessAsUserW(hooks.token, nullptr, mutableLine.data(), nullptr, nullptr,
+                                   FALSE, flags, block, folder, &startup, &process)
+            : CreateProcessW(nullptr, mutableLine.data(), nullptr, nullptr, FALSE, flags, block,
+                             folder, &startup, &process);
+    if (!created) {
         result->exitCode = -9999;
         result->crashed = true;
         return;
@@ -161,6 +169,9 @@ void RunAsDebuggee(const std::wstring& commandLine, const std::vector<wchar_t>& 
                     ReadDebugString(process.hProcess, event.u.DebugString));
                 break;
             case EXCEPTION_DEBUG_EVENT: {
+                if (hooks.stop != nullptr && hooks.stop->OnException(process.hProcess, event)) {
+                    break;
+                }
                 const EXCEPTION_RECORD& record = event.u.Exception.ExceptionRecord;
                 if (record.ExceptionCode == EXCEPTION_BREAKPOINT ||
                     record.ExceptionCode == 0x4000001F /* WOW64 breakpoint */) {
@@ -216,19 +227,21 @@ ProgramUnderTest::ProgramUnderTest(const std::wstring& folder, const ProgramOpti
     m_env[L"QM_FAKE_CALLS_LOG"] = callsLogPath();
 }
 
-RunResult ProgramUnderTest::Run(const std::wstring& arguments, DWORD timeoutMs) {
+RunResult ProgramUnderTest::Run(const std::wstring& arguments, DWORD timeoutMs,
+                                const DebuggeeHooks& hooks) {
     std::wstring line = L"\"" + m_exePath + L"\"";
     if (!arguments.empty()) {
         line += L" " + arguments;
     }
-    return RunRaw(line, timeoutMs);
+    return RunRaw(line, timeoutMs, hooks);
 }
 
-RunResult ProgramUnderTest::RunRaw(const std::wstring& commandLine, DWORD timeoutMs) {
+RunResult ProgramUnderTest::RunRaw(const std::wstring& commandLine, DWORD timeoutMs,
+                                   const DebuggeeHooks& hooks) {
     DeleteFileW(traceLogPath().c_str());
     DeleteFileW(callsLogPath().c_str());
     RunResult result;
-    RunAsDebuggee(commandLine, BuildEnvironmentBlock(m_env), m_folder, timeoutMs, &result);
+    RunAsDebuggee(commandLine, BuildEnvironmentBlock(m_env), m_folder, timeoutMs, &result, hooks);
     result.traces = ParseTraceLog(ReadFileBytes(traceLogPath()));
     return result;
 }

@@ -37,6 +37,15 @@ struct RunResult {
     bool HasDebugOutput(const std::string& text) const;
 };
 
+class EntryStop;
+
+// Extras of a run: the primary token to start the program with (instead of
+// the test's own), and a stop at a system function's entry.
+struct DebuggeeHooks {
+    HANDLE token = nullptr;
+    EntryStop* stop = nullptr;
+};
+
 enum class TraceLibrary {
     kBoth,     // exports both entry points
     kRawOnly,  // exports only "MRVTRACERAWA"
@@ -64,9 +73,11 @@ public:
 
     // Runs with `arguments` as the command line after the program name.
     // Trace and calls logs are emptied first.
-    RunResult Run(const std::wstring& arguments, DWORD timeoutMs = 60000);
+    RunResult Run(const std::wstring& arguments, DWORD timeoutMs = 60000,
+                  const DebuggeeHooks& hooks = {});
     // Runs with exactly this command line (program name included).
-    RunResult RunRaw(const std::wstring& commandLine, DWORD timeoutMs = 60000);
+    RunResult RunRaw(const std::wstring& commandLine, DWORD timeoutMs = 60000,
+                     const DebuggeeHooks& hooks = {});
 
 private:
     std::wstring m_folder;
@@ -81,4 +92,5 @@ std::vector<wchar_t> BuildEnvironmentBlock(const std::map<std::wstring, std::wst
 // Runs a command line as a debuggee until it exits (or is killed after
 // timeoutMs) and fills result (exit code, debugger output, exceptions).
 void RunAsDebuggee(const std::wstring& commandLine, const std::vector<wchar_t>& environment,
-                   const std::wstring& workingDir, DWORD timeoutMs, RunResult* result);
+                   const std::wstring& workingDir, DWORD timeoutMs, RunResult* result,
+                   const DebuggeeHooks& hooks = {});

@@ -1,0 +1,114 @@
+// The update service's removal against the prefix's own service manager, with
+// a stand-in service that stops after a scripted number of polls or never.
+// Problems go to the event log, which Wine shows on its "eventlog" debug
+// channel: the program is run by the host's wine to read that channel.
+#include <windows.h>
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+#include "cleanup/update_service.h"
+#include "tests/support/file_util.h"
+#include "tests/support/host_shell.h"
+#include "tests/support/machine_fixture.h"
+#include "tests/support/test_paths.h"
+
+namespace {
+
+class UpdateServiceTest : public MachineTest {
+protected:
+    ~UpdateServiceTest() override {
+        HANDLE release =
+            OpenEventW(EVENT_MODIFY_STATE, FALSE, L"Global\\QMFakeMirovanServiceRelease");
+        if (release != nullptr) {
+            SetEvent(release);
+            CloseHandle(release);
+        }
+        Open(DELETE, [](SC_HANDLE service) { DeleteService(service); });
+        for (int i = 0; i < 100 && Installed(); ++i) {
+            Sleep(100);
+        }
+        CloseServiceHandle(m_manager);
+    }
+    template <typename Fn>
+    bool Open(DWORD access, Fn fn) {
+        SC_HANDLE service = OpenServiceW(m_manager, L"MirovanService", access);
+        if (service != nullptr) {
+            fn(service);
+            CloseServiceHandle(service);
+        }
+        return service != nullptr;
+    }
+    bool Installed() {
+        return Open(SERVICE_QUERY_STATUS, [](SC_HANDLE) {});
+    }
+    // Registers the stand-in and has the service manager start it.
+    void Install(const wchar_t* polls, const wchar_t* waitHint = L"1000") {
+        std::wstring command = L"\"" + FakePath(L"mirovan_service.exe") + L"\" \"" +
+                               Program().callsLogPath() + L"\" " + waitHint + L" " + polls;
+        CloseServiceHandle(
+            CreateServiceW(m_manager, L"MirovanService", L"MirovanService", SERVICE_ALL_ACCESS,
+                           SERVICE_WIN32_OWN_PROCESS, SERVICE_DEMAND_START, SERVICE_ERROR_IGNORE,
+                           command.c_str(), nullptr, nullptr, nullptr, nullptr, nullptr));
+        ASSERT_TRUE(Open(SERVICE_START, [](SC_HANDLE s) { StartServiceW(s, 0, nullptr); }));
+        for (int i = 0; i < 100 && ReadFileBytes(Program().callsLogPath()).empty(); ++i) {
+            Sleep(100);  // until it reports running
+        }
+    }
+    // -delallqmfiles on a machine without the suite: the texts it reported to
+    // the event log; elapsedMs the time it took.
+    std::vector<std::string> Run() {
+        const std::wstring errors = m_scratch.Sub(L"stderr.txt");
+        const DWORD start = GetTickCount();
+        EXPECT_EQ(0,
+                  RunHostShell("WINEDEBUG=-all,warn+eventlog wine \"$1\" -delallqmfiles 2>\"$2\"",
+                               {Narrow(Program().exePath()), HostPath(errors)}));
+        elapsedMs = GetTickCount() - start;
+        std::vector<std::string> events;
+        const std::string text = ReadFileBytes(errors), marker = ":warn:eventlog:ReportEventW ";
+        for (size_t at = text.find(marker); at != std::string::npos; at = text.find(marker, at)) {
+            at += marker.size();
+            events.push_back(text.substr(at, text.find('\n', at) - at));
+        }
+        return events;
+    }
+
+    SC_HANDLE m_manager = OpenSCManagerW(nullptr, nullptr, SC_MANAGER_ALL_ACCESS);
+    DWORD elapsedMs = 0;
+};
+
+TEST_F(UpdateServiceTest, ServiceThatIsNotInstalledGivesOneWarning) {
+    EXPECT_EQ(std::vector<std::string>{"L\"SvcUninstall::OpenServiceW(1060)\""}, Run());
+}
+
+TEST_F(UpdateServiceTest, ServiceIsDeletedOnceItHasStopped) {
+    Install(L"3");
+    EXPECT_TRUE(Run().empty());
+    // Gone as the program ends: it waited three wait hints after its pause.
+    EXPECT_FALSE(Installed());
+    EXPECT_GE(elapsedMs, 4000u);
+    EXPECT_EQ("MirovanService running\nMirovanService stop requested\nMirovanService stopped\n",
+              ReadFileBytes(Program().callsLogPath()));
+}
+
+TEST_F(UpdateServiceTest, ServiceMarkedForDeletionCountsAsRemoved) {
+    Install(L"1");
+    ASSERT_TRUE(Open(DELETE, [](SC_HANDLE service) { DeleteService(service); }));
+    EXPECT_TRUE(SvcUninstall());
+}
+
+// Waits out the 60 s limit: run on its own, labelled slow. The second wait
+// hint of 45 s is cut to what is left of the minute.
+TEST_F(UpdateServiceTest, ServiceThatNeverStopsIsMarkedForDeletionAfterAMinute) {
+    Install(L"never", L"45000");
+    EXPECT_TRUE(Run().empty());
+    EXPECT_GE(elapsedMs, 61000u);
+    EXPECT_LT(elapsedMs, 80000u);
+    // Marked: the manager deletes it as soon as it stops.
+    DWORD error = 0;
+    Open(DELETE, [&error](SC_HANDLE s) { error = DeleteService(s) ? 0 : GetLastError(); });
+    EXPECT_EQ(DWORD(ERROR_SERVICE_MARKED_FOR_DELETE), error);
+}
+
+}  // namespace
