@@ -21,7 +21,7 @@ int WINAPI _tWinMain(HINSTANCE instance, HINSTANCE previousInstance, LPTSTR comm
     int exitCode = 0;
     {
         SuiteLibraryHolder suiteLibrary(1);
-        SetThreadUILanguage(LanguageCodeToLangId(GetUILanguageCode()));
+        SetProgramUILanguage();
         exitCode = RunCommandLine(instance, previousInstance, commandLine, showCommand);
         CoUninitialize();
     }

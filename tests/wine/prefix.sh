@@ -31,6 +31,26 @@ case "$command" in
         ! -path '*/drive_c/windows/syswow64/*' ! -path '*/drive_c/windows/winsxs/*' \
         -exec sh -c 'for f; do cp -p --remove-destination "$f" "$f.qmcopy" && mv -f "$f.qmcopy" "$f"; done' _ {} +
     rm -f "$dir/.qm-template-ready"
+    # The user's shell folders (Desktop, Documents...) are host links to the
+    # Unix home folder: real folders instead, so that nothing a test or the
+    # demo writes or deletes there reaches the host.
+    for link in "$dir"/drive_c/users/*/*; do
+      if [ -L "$link" ]; then rm -f "$link" && mkdir "$link"; fi
+    done
+    # Wine's menu builder turns every shortcut saved under the Start menu or on
+    # the desktop into menu entries, icons and .desktop files in the host
+    # user's home folder: disabled (an empty override), before the prefix runs.
+    if ! grep -q '^"winemenubuilder.exe"=' "$dir/user.reg"; then
+      awk -v value='"winemenubuilder.exe"=""' '
+        pending && /^#time=/ { print; print value; pending = 0; next }
+        pending { print value; pending = 0 }
+        { print }
+        /^\[Software\\\\Wine\\\\DllOverrides\]/ { pending = 1; found = 1 }
+        END { if (pending) print value
+              if (!found) { print ""; print "[Software\\\\Wine\\\\DllOverrides] 0"; print value } }
+      ' "$dir/user.reg" > "$dir/user.reg.qmnew"
+      mv -f "$dir/user.reg.qmnew" "$dir/user.reg"
+    fi
     ;;
   remove)
     dir=$1

@@ -1,4 +1,5 @@
-// Stand-in for a running program, built as OUTLOOK.EXE and as qmoneclk.exe.
+// Stand-in for a running program, built as OUTLOOK.EXE, qmoneclk.exe and
+// qminst.exe.
 // Started with "-stay" it just runs until it is ended; otherwise it records
 // its command line (without its own name) in the calls log and ends.
 #include <windows.h>
