@@ -7,6 +7,7 @@
 #include <windows.h>
 #include <shlobj.h>
 
+#include <algorithm>
 #include <functional>
 #include <map>
 #include <memory>
@@ -49,6 +50,7 @@ const std::vector<Intended> kUninstallLeftovers = {
      "the C runtime stays beside Sametime: the removal deletes only the older runtime's names"},
 };
 const std::vector<Intended> kRepairChanges = {
+    {"changed *.lnk", "a shortcut saved again records the file times of its target's path anew"},
     {"removed *\\last.config.stamp.bak",
      "a second stamp reset finds no stamp and drops the first one's backup"},
 };
@@ -76,9 +78,9 @@ std::string XmlContent(const std::string& xml) {
 void AddFiles(Snapshot& snapshot, const std::string& label, const std::wstring& root) {
     for (const auto& item : TreeSnapshot(root)) {
         std::string name = Narrow(item.first);
-        snapshot[label + "\\" + name] = Matches("*platform.xml", name.c_str())
-                                            ? XmlContent(ReadFileBytes(JoinPath(root, item.first)))
-                                            : std::to_string(item.second);
+        std::string bytes = ReadFileBytes(JoinPath(root, item.first));
+        snapshot[label + "\\" + name] =
+            Matches("*platform.xml", name.c_str()) ? XmlContent(bytes) : bytes;
     }
 }
 
@@ -283,6 +285,10 @@ TEST_F(InstallerRoad, InstallRepairUninstallLeavesOnlyWhatIsIntended) {
     RegPutString(HKEY_CURRENT_USER, L"Software\\Mirovan\\QmkTools", L"LastSite",
                  L"meet.mirovan.example");
     Snapshot installed = TakeSnapshot();
+    // The one-click, settings, help and uninstall shortcuts in the Start menu.
+    EXPECT_EQ(4, std::count_if(installed.begin(), installed.end(), [](const auto& item) {
+                  return Matches("Programs\\Mirovan Meetings\\*.lnk", item.first.c_str());
+              }));
 
     Install();
     EXPECT_EQ(std::vector<std::string>(), Unexplained(installed, TakeSnapshot(), kRepairChanges));
