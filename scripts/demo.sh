@@ -6,7 +6,10 @@
 #   - IBM Sametime Connect 8 in C:\Program Files\IBM\Sametime Connect, found
 #     through its uninstall entry;
 #   - a Sametime 8 profile whose Eclipse platform.xml does not list the meeting
-#     feature yet.
+#     feature yet;
+#   - the suite's companion meeting application, registered by Windows
+#     Installer under one of the suite's upgrade codes: the suite's Start-menu
+#     folder is named after it.
 # The suite's installer package (build/bin/installer/QuillmarkTools.msi) is
 # installed with msiexec, which runs the program as its custom actions; the
 # suite is then used (the steps that call the installed program directly) and
@@ -44,6 +47,15 @@ desktops=("$c/users/Public/Desktop" "$c/users/$user/Desktop")
 reg() { wine reg add "$@" /reg:32 /f >/dev/null; }
 section() { printf '\n== %s\n' "$1"; }
 listing() { (cd "$1" && find . -type f | sed 's|^\./||' | sort | sed 's/^/    /'); }
+shortcuts() {
+  local folder found
+  for folder in "${startmenus[@]}" "${desktops[@]}"; do
+    found=$(cd "$folder" && find . -name '*.lnk' | sed 's|^\./||' | sort)
+    [ -n "$found" ] || continue
+    echo "  ${folder#"$c/"}:"
+    while IFS= read -r link; do echo "    $link"; done <<< "$found"
+  done
+}
 
 # The files (with a checksum) and registry values of the products concerned,
 # one line each; the suite's own folders by their number of files. Desktops
@@ -111,6 +123,10 @@ eclipse_config() {  # folder, site url
 XML
   touch "$1/last.config.stamp"
 }
+wine reg add 'HKLM\Software\Microsoft\Windows\CurrentVersion\Installer\UpgradeCodes\1A705790D0FBFFE4DBC7B0F099009CD9' \
+  /v 39A1EB3B91C93B54EAD80FE3C665084C /d '' /reg:64 /f >/dev/null
+wine reg add 'HKLM\SOFTWARE\Microsoft\Windows\CurrentVersion\Uninstall\{B3BE1A93-9C19-45B3-AE8D-F03E6C5680C4}' \
+  /v DisplayName /d 'Mirovan Meeting Center' /reg:64 /f >/dev/null
 eclipse_config "$config" "file:../shared/eclipse/"
 eclipse_config "$notes/Data/workspace/.config/org.eclipse.update" \
                "platform:/config/../applications/eclipse/"
@@ -118,6 +134,7 @@ echo "  Notes folder: C:\\Program Files\\IBM\\Lotus\\Notes"
 listing "$notes"
 echo "  Sametime Connect folder: C:\\Program Files\\IBM\\Sametime Connect"
 listing "$sametime"
+echo "  companion application: Mirovan Meeting Center"
 snapshot > "$prefix/machine.before"
 
 # Runs the installed program with each argument as its command line.

@@ -8,5 +8,7 @@ msiexec /i "$package"
 snapshot > "$prefix/machine.installed"
 echo "  what changed on the machine:"
 changes "$prefix/machine.before" "$prefix/machine.installed"
+echo "  shortcuts now:"
+shortcuts
 echo "  the Sametime profile's platform.xml now:"
 sed 's/^/    /' "$config/platform.xml"
