@@ -1,7 +1,9 @@
 #include "actions/suite_version.h"
 
-// Names the installed suite's version. The version lookup of the suite is
-// not part of the program yet, so the version is unknown: empty.
+#include "version/qm_version.h"
+
 CStringEx ReportSuiteVersion() {
-    return CStringEx();
+    CStringEx version;
+    GetQMBuildNumber(version);
+    return version;
 }

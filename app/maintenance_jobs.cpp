@@ -363,8 +363,7 @@ int JobDelSametimeFilesEx() {
 int JobMocVistaInstall() {
     LogJobMessage("qmmirovanoni.exe: Call mocvistainstall.");
     PauseBeforeJob();
-    CMOCCustomStatusInstall install;
-    install.SilentInstall();
+    CMOCCustomStatusInstall::SilentInstall();
     return 0;
 }
 

@@ -18,10 +18,14 @@ inline void Bstr(BSTR s) {
 inline void TaskMem(void* p) {
     ::CoTaskMemFree(p);
 }
+inline void SafeArray(SAFEARRAY* array) {
+    ::SafeArrayDestroy(array);
+}
 }  // namespace com_free
 
 using UniqueBstr = UniqueResource<NullIsNoneTraits<BSTR, com_free::Bstr>>;
 using UniqueCoTaskMem = UniqueResource<NullIsNoneTraits<void*, com_free::TaskMem>>;
+using UniqueSafeArray = UniqueResource<NullIsNoneTraits<SAFEARRAY*, com_free::SafeArray>>;
 
 // Owns a VARIANT and clears it on every path.
 class UniqueVariant {

@@ -3,11 +3,6 @@
 #include "base/os_version.h"
 #include "base/user_profile.h"
 
-namespace {
-
-const REGSAM kReadWrite = KEY_READ | KEY_WRITE;  // 0x2001F
-
-// HKEY_CURRENT_USER stands for the console user's root on Vista and later.
 HKEY RedirectedRoot(HKEY root) {
     if (root == HKEY_CURRENT_USER && GetOSVersionClass() == kOSVistaOrLater) {
         HKEY userRoot = GetUserRegRoot();
@@ -15,6 +10,10 @@ HKEY RedirectedRoot(HKEY root) {
     }
     return root;
 }
+
+namespace {
+
+const REGSAM kReadWrite = KEY_READ | KEY_WRITE;  // 0x2001F
 
 UniqueHKey OpenKey(HKEY root, const wchar_t* subkey, REGSAM access) {
     UniqueHKey key;

@@ -16,6 +16,11 @@
 #include "base/string_ex.h"
 #include "base/win_handles.h"
 
+// The root the redirected functions use for root: the console user's root
+// for HKEY_CURRENT_USER on Vista and later, else root itself. For the
+// functions that do not redirect, when they must reach the same key.
+HKEY RedirectedRoot(HKEY root);
+
 // Creates (or opens) root\subkey with KEY_ALL_ACCESS | view. Not redirected.
 UniqueHKey CreateRegKey(HKEY root, const wchar_t* subkey, REGSAM view);
 // 1 when root\subkey opens with KEY_QUERY_VALUE | view. Not redirected.

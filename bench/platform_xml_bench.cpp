@@ -72,10 +72,7 @@ int wmain(int argc, wchar_t** argv) {
         std::printf("COM could not be initialised\n");
         return 1;
     }
-    wchar_t temp[MAX_PATH] = {};
-    GetTempPathW(MAX_PATH, temp);
-    std::wstring folder = std::wstring(temp) + L"qm-platform-xml-bench";
-    CreateDirectoryW(folder.c_str(), nullptr);
+    std::wstring folder = MakeScratchFolder(L"qm-platform-xml-bench");
     std::wstring path = folder + L"\\platform.xml";
     if (!WriteWholeFile(path, BigConfig())) {
         std::printf("cannot write %ls\n", path.c_str());

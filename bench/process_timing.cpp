@@ -91,12 +91,16 @@ bool WriteWholeFile(const std::wstring& path, const std::string& bytes) {
     return ok && written == bytes.size();
 }
 
-ProgramCopy::ProgramCopy(const wchar_t* folderName) {
+std::wstring MakeScratchFolder(const wchar_t* name) {
     wchar_t temp[MAX_PATH] = {};
     GetTempPathW(MAX_PATH, temp);
-    m_folder = std::wstring(temp) + folderName;
-    m_program = m_folder + L"\\qmMrvONI.exe";
-    CreateDirectoryW(m_folder.c_str(), nullptr);
+    std::wstring folder = std::wstring(temp) + name;
+    CreateDirectoryW(folder.c_str(), nullptr);
+    return folder;
+}
+
+ProgramCopy::ProgramCopy(const wchar_t* folderName)
+    : m_folder(MakeScratchFolder(folderName)), m_program(m_folder + L"\\qmMrvONI.exe") {
     std::wstring bin = BuildBinDir();
     CopyFileW((bin + L"\\qmMrvONI.exe").c_str(), m_program.c_str(), FALSE);
     CopyFileW((bin + L"\\fakes\\mrvtrace.dll").c_str(), (m_folder + L"\\mrvtrace.dll").c_str(),

@@ -21,6 +21,9 @@ int RunQuietly(const std::wstring& commandLine);
 // build/bin, seen from a benchmark in build/bin/bench.
 std::wstring BuildBinDir();
 
+// The folder name in the temporary folder, created when missing.
+std::wstring MakeScratchFolder(const wchar_t* name);
+
 // The program as installed, in %TEMP%\folderName with the trace stand-in
 // beside it (which writes nothing without its log variable); removed at the end.
 class ProgramCopy {

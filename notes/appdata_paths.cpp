@@ -1,6 +1,8 @@
-// The suite's per-user data folder "<roaming AppData>\Mirovan\Quillmark Tools",
-// created on first use.
+// The suite's data folders "<AppData>\Mirovan\Quillmark Tools", per user and
+// for all users, created on first use.
 #include <shlobj.h>
+
+#include <string>
 
 #include "base/com_owners.h"
 #include "base/reparse_guard.h"
@@ -14,24 +16,25 @@ const size_t kAppDataLimitChars = 2 * MAX_PATH;
 
 }  // namespace
 
-bool GetAppDataMrvQMPath(const wchar_t* name, CStringEx& out) {
+bool GetMrvQMDataPath(int csidl, const char* caller, const wchar_t* name, CStringEx& out) {
+    const std::string who(caller);
     if (name == nullptr) {
-        TraceLevel1(TraceValue("GetAppDataMrvQMPath: input para was NULL!"));
+        TraceLevel1(TraceValue(who + ": input para was NULL!"));
         return false;
     }
     wchar_t folder[MAX_PATH] = {};
     {
         UniqueCoTaskMem itemList;
         PIDLIST_ABSOLUTE pidl = nullptr;
-        HRESULT hr = SHGetSpecialFolderLocation(nullptr, CSIDL_APPDATA, &pidl);
+        HRESULT hr = SHGetSpecialFolderLocation(nullptr, csidl, &pidl);
         itemList.reset(pidl);
         if (FAILED(hr) || pidl == nullptr || !SHGetPathFromIDListW(pidl, folder)) {
-            TraceLevel1(TraceValue("GetAppDataMrvQMPath: SHGetSpecialFolderLocation FAILED!"));
+            TraceLevel1(TraceValue(who + ": SHGetSpecialFolderLocation FAILED!"));
             return false;
         }
     }
     if (wcsnlen(folder, MAX_PATH) >= kAppDataLimitChars) {
-        TraceLevel1(TraceValue("GetAppDataMrvQMPath: Get FilePath was overload!"));
+        TraceLevel1(TraceValue(who + ": Get FilePath was overload!"));
         return false;
     }
     wchar_t mirovan[MAX_PATH];
@@ -45,7 +48,7 @@ bool GetAppDataMrvQMPath(const wchar_t* name, CStringEx& out) {
         built = JoinFilePath(suite, name, path);
     }
     if (!built) {
-        TraceLevel1(TraceValue("GetAppDataMrvQMPath: Get FilePath was overload!"));
+        TraceLevel1(TraceValue(who + ": Get FilePath was overload!"));
         return false;
     }
     // The folders are the user's: a link planted in them would carry the
@@ -57,7 +60,11 @@ bool GetAppDataMrvQMPath(const wchar_t* name, CStringEx& out) {
     // the caller's own file work.
     CreateDirectoryW(mirovan, nullptr);
     CreateDirectoryW(suite, nullptr);
-    TraceLevel1(TraceValue("GetAppDataMrvQMPath"), TraceNamed("strFilePath", path));
+    TraceLevel1(TraceValue(caller), TraceNamed("strFilePath", path));
     out = path;
     return true;
+}
+
+bool GetAppDataMrvQMPath(const wchar_t* name, CStringEx& out) {
+    return GetMrvQMDataPath(CSIDL_APPDATA, "GetAppDataMrvQMPath", name, out);
 }

@@ -5,7 +5,7 @@
 #include "base/com_owners.h"
 #include "base/staged_file.h"
 #include "base/trace.h"
-#include "notes/untrusted_xml_bytes.h"
+#include "base/untrusted_xml_bytes.h"
 
 namespace {
 
@@ -39,24 +39,7 @@ void SetStringVariant(UniqueVariant& variant, const wchar_t* text) {
 }
 
 void LogLoadRefusal(UntrustedXmlRead reason) {
-    const char* text = nullptr;
-    switch (reason) {
-        case UntrustedXmlRead::kUnreadable:
-            text = "PlatformXml: the file cannot be read\n";
-            break;
-        case UntrustedXmlRead::kEmpty:
-            text = "PlatformXml: the file is empty\n";
-            break;
-        case UntrustedXmlRead::kTooLarge:
-            text = "PlatformXml: the file is too large\n";
-            break;
-        case UntrustedXmlRead::kHasDoctype:
-            text = "PlatformXml: the file has a document type declaration\n";
-            break;
-        case UntrustedXmlRead::kOk:
-            return;
-    }
-    TraceLevel4(TraceValue(text));
+    TraceLevel4(TraceValue(std::string("PlatformXml: ") + DescribeUntrustedXmlRead(reason)));
 }
 
 // One platform.xml opened at its site element.

@@ -34,3 +34,7 @@ bool GetSametimePath(wchar_t* lpszPath, DWORD capacity, DWORD* version);
 bool GetSametimeConfigPath(int profile, CStringEx& out);
 // name in the suite's per-user folder "<AppData>\Mirovan\Quillmark Tools".
 bool GetAppDataMrvQMPath(const wchar_t* name, CStringEx& out);
+// name in "<folder>\Mirovan\Quillmark Tools" under the shell folder csidl
+// (CSIDL_APPDATA, CSIDL_COMMON_APPDATA), the two folders created, no link
+// below the shell folder; the messages begin with caller.
+bool GetMrvQMDataPath(int csidl, const char* caller, const wchar_t* name, CStringEx& out);

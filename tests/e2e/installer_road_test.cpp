@@ -44,6 +44,11 @@ struct Intended {
 const std::vector<Intended> kUninstallLeftovers = {
     {"added HKCU*\\SmartTagActions\\", "Office's key of smart-tag actions, left empty"},
     {"added HKCU\\Mirovan\\", "the vendor key above the suite's removed settings"},
+    {"added HKLM*\\Policies\\", "the machine's policy key, above Communicator's"},
+    {"added HKLM*\\Policies\\Communicator\\*",
+     "the presence state: no keyword removes Communicator's custom-state policy"},
+    {"added ProgramData\\Quillmark Tools\\", "the folder of the status file the policy names"},
+    {"added ProgramData\\Quillmark Tools\\status.xml", "the status file the policy names"},
     {"removed *\\last.config.stamp", "each stamp reset makes Eclipse re-read its configuration"},
     {"added *\\last.config.stamp.bak", "the reset stamp's backup"},
     {"added Sametime\\rcp\\msvc?120.dll",
@@ -184,12 +189,7 @@ public:
             PutEclipseConfig(ProfileConfig(profile), "file:../shared/eclipse/");
         }
     }
-    ~InstallerRoad() override {
-        Msiexec(std::wstring(L"/x ") + kProductCode);
-        RegRemoveTree(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Policies\\Microsoft\\Communicator");
-        RegRemoveTree(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Policies\\Microsoft\\Office");
-        RemoveTree(JoinPath(ShellFolder(CSIDL_COMMON_APPDATA), L"Mirovan"));
-    }
+    ~InstallerRoad() override { Msiexec(std::wstring(L"/x ") + kProductCode); }
 
     std::wstring ProfileConfig(const wchar_t* profile) const {
         return JoinPath(RoamingAppData(),
@@ -204,7 +204,7 @@ public:
         for (const wchar_t* folder : {L"Lotus", L"IBM", L"Mirovan"}) {
             AddFiles(snapshot, "AppData\\" + Narrow(folder), JoinPath(RoamingAppData(), folder));
         }
-        AddFiles(snapshot, "ProgramData", JoinPath(ShellFolder(CSIDL_COMMON_APPDATA), L"Mirovan"));
+        AddFiles(snapshot, "ProgramData", JoinPath(CommonAppData(), L"Mirovan"));
         AddFiles(snapshot, "Programs", ShellFolder(CSIDL_PROGRAMS));
         AddFiles(snapshot, "CommonPrograms", ShellFolder(CSIDL_COMMON_PROGRAMS));
         AddLinks(snapshot, "Desktop", ShellFolder(CSIDL_DESKTOPDIRECTORY));
@@ -285,6 +285,7 @@ TEST_F(InstallerRoad, InstallRepairUninstallLeavesOnlyWhatIsIntended) {
     RegPutString(HKEY_CURRENT_USER, L"Software\\Mirovan\\QmkTools", L"LastSite",
                  L"meet.mirovan.example");
     Snapshot installed = TakeSnapshot();
+    EXPECT_EQ(1u, installed.count("ProgramData\\Quillmark Tools\\status.xml"));
     // The one-click, settings, help and uninstall shortcuts in the Start menu.
     EXPECT_EQ(4, std::count_if(installed.begin(), installed.end(), [](const auto& item) {
                   return Matches("Programs\\Mirovan Meetings\\*.lnk", item.first.c_str());

@@ -140,8 +140,9 @@ protected:
 };
 
 // A user name in another script: the zip is opened by its wide path and MAPI
-// gets a path it can open.
+// gets a path it can open. The subject names the suite's version.
 TEST_F(ProblemReportTest, TraceFilesAreZippedAndMailedAsOneAttachment) {
+    RegPutString(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Mirovan\\QmkTools", L"BuildNumber", L"2.0.1.123");
     for (const wchar_t* folder : {L"temp", L"\u0418\u0432\u0430\u043d_\u0e01\u0e02"}) {
         SCOPED_TRACE(Narrow(folder));
         UseTraceFolder(m_scratch.Sub(folder));
@@ -151,7 +152,7 @@ TEST_F(ProblemReportTest, TraceFilesAreZippedAndMailedAsOneAttachment) {
         EXPECT_TRUE(run.HasTrace(" the compress successed,\n"));
         std::string mail =
             "MAPISendMail session=0 ui=0 flags=9 reserved=0\n"
-            "subject=Quillmark Tools problem report \n"
+            "subject=Quillmark Tools problem report 2.0.1.123\n"
             "note=Please describe the problem: what did you do, 100% sure?\n"
             "recipients=0 originator=none\n" +
             std::string(kZipAttachment);

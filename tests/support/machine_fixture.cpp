@@ -16,6 +16,8 @@ const wchar_t* const kMachineKeys[] = {
     L"SOFTWARE\\Lotus",
     L"SOFTWARE\\Citrix\\Citrix Management Console",
     L"SOFTWARE\\Classes\\CLSID\\{A12A21B3-CFDA-497E-98C0-CE60D4D108C8}",
+    L"Software\\Policies\\Microsoft\\Communicator",
+    L"Software\\Policies\\Microsoft\\Office\\15.0\\Lync",
 };
 
 const wchar_t* const kUserKeys[] = {
@@ -28,6 +30,9 @@ const wchar_t* const kUserKeys[] = {
     L"SOFTWARE\\Classes\\MrvRMenu.MirovanRightMenu",
     L"SOFTWARE\\Classes\\MrvRMenu.MirovanRightMenu.1",
     L"SOFTWARE\\Classes\\*\\shellex\\ContextMenuHandlers\\MirovanShareMenu",
+    L"Software\\Policies\\Microsoft\\Communicator",
+    L"Software\\Policies\\Microsoft\\Office\\15.0\\Lync",
+    L"Software\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\QuillmarkTools",
 };
 
 const wchar_t kUninstallKey[] = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall";
@@ -66,6 +71,12 @@ std::wstring RoamingAppData() {
     return path;
 }
 
+std::wstring CommonAppData() {
+    wchar_t path[MAX_PATH] = {};
+    SHGetFolderPathW(nullptr, CSIDL_COMMON_APPDATA, nullptr, SHGFP_TYPE_CURRENT, path);
+    return path;
+}
+
 void ClearProductState() {
     for (REGSAM view : {REGSAM(0), REGSAM(KEY_WOW64_64KEY)}) {
         for (const wchar_t* key : kMachineKeys) {
@@ -84,6 +95,7 @@ void ClearProductState() {
     for (const wchar_t* folder : {L"Lotus", L"IBM", L"Mirovan"}) {
         RemoveTree(JoinPath(appData, folder));
     }
+    RemoveTree(JoinPath(CommonAppData(), L"Mirovan"));
 }
 
 MachineTest::MachineTest()

@@ -22,6 +22,8 @@ void ClearProductState();
 
 // The user's roaming application-data folder of this prefix.
 std::wstring RoamingAppData();
+// The all-users application-data folder of this prefix.
+std::wstring CommonAppData();
 
 // Uninstall entries that tests create are named with this prefix.
 extern const wchar_t kTestUninstallPrefix[];

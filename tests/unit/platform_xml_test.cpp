@@ -5,7 +5,7 @@
 #include <string>
 
 #include "notes/platform_xml.h"
-#include "notes/untrusted_xml_bytes.h"
+#include "base/untrusted_xml_bytes.h"
 #include "tests/support/file_util.h"
 #include "tests/support/scratch_dir.h"
 

@@ -19,12 +19,17 @@ enum class UntrustedXmlRead {
     kEmpty,
     kTooLarge,
     kHasDoctype,
+    kNotWellFormed,  // the parser refused the bytes (LoadUntrustedXmlFile)
 };
 
 // True when data holds "<!DOCTYPE" in any of the encodings the parser reads
 // (UTF-8 and other ASCII supersets, UTF-16 and UCS-4 in either byte order):
 // NUL bytes are skipped while matching.
 bool HasDoctypeDeclaration(const BYTE* data, size_t size);
+
+// Why a read was refused, as a log line ends it ("the file is too large\n");
+// empty for kOk.
+const char* DescribeUntrustedXmlRead(UntrustedXmlRead reason);
 
 // Reads the whole file into a new one-dimensional byte array (*bytes, owned
 // by the caller, null on failure) after the checks above.

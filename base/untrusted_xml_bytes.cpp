@@ -1,16 +1,9 @@
-#include "notes/untrusted_xml_bytes.h"
+#include "base/untrusted_xml_bytes.h"
 
+#include "base/com_owners.h"
 #include "base/win_handles.h"
 
 namespace {
-
-struct SafeArrayTraits {
-    using Type = SAFEARRAY*;
-    static SAFEARRAY* None() noexcept { return nullptr; }
-    static bool IsValid(SAFEARRAY* array) noexcept { return array != nullptr; }
-    static void Close(SAFEARRAY* array) noexcept { SafeArrayDestroy(array); }
-};
-using UniqueSafeArray = UniqueResource<SafeArrayTraits>;
 
 // Unlocks the data of a safe array at the end of a scope.
 class SafeArrayDataLock {
@@ -67,6 +60,24 @@ bool HasDoctypeDeclaration(const BYTE* data, size_t size) {
         }
     }
     return false;
+}
+
+const char* DescribeUntrustedXmlRead(UntrustedXmlRead reason) {
+    switch (reason) {
+        case UntrustedXmlRead::kUnreadable:
+            return "the file cannot be read\n";
+        case UntrustedXmlRead::kEmpty:
+            return "the file is empty\n";
+        case UntrustedXmlRead::kTooLarge:
+            return "the file is too large\n";
+        case UntrustedXmlRead::kHasDoctype:
+            return "the file has a document type declaration\n";
+        case UntrustedXmlRead::kNotWellFormed:
+            return "the file is not well-formed XML\n";
+        case UntrustedXmlRead::kOk:
+            break;
+    }
+    return "";
 }
 
 UntrustedXmlRead ReadUntrustedXml(const wchar_t* path, SAFEARRAY** bytes) {
