@@ -75,7 +75,7 @@ snapshot() {
     find "$root/" -maxdepth 1 -name '*.lnk' 2>/dev/null | sed "s|^$c/|file |" || true
   done
   for key in 'HKLM\SOFTWARE\Mirovan' 'HKLM\SOFTWARE\Policies\Microsoft' 'HKCU\Software\Mirovan' \
-             'HKCU\Software\Microsoft\Office\Common\Smart Tag\Actions' \
+             'HKCU\Software\Microsoft\Office\Common\Smart Tag' \
              "HKLM\\Software\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\$product:64"; do
     view=${key##*:}; [ "$view" = "$key" ] && view=32
     wine reg query "${key%:64}" /s /reg:$view 2>/dev/null | tr -d '\r' | grep -v '^reg:' |
