@@ -6,7 +6,6 @@
 // addshortcuts) are counted apart: what remains is the program's own share.
 // Usage: installer_road_bench [rounds]
 #include <windows.h>
-#include <shlobj.h>
 
 #include <cstdio>
 #include <string>
@@ -98,9 +97,5 @@ int wmain(int argc, wchar_t** argv) {
     Report("uninstall", program.uninstall, 7, kUninstallPausesMs, baseline.uninstall.Median());
 
     ClearProductState();
-    wchar_t common[MAX_PATH] = {};
-    SHGetFolderPathW(nullptr, CSIDL_COMMON_APPDATA, nullptr, SHGFP_TYPE_CURRENT, common);
-    RemoveTree(JoinPath(common, L"Mirovan"));
-    RegRemoveTree(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Policies\\Microsoft\\Communicator");
     return 0;
 }
