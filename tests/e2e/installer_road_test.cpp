@@ -89,15 +89,6 @@ void AddFiles(Snapshot& snapshot, const std::string& label, const std::wstring& 
     }
 }
 
-// The shortcuts on a desktop (which may be a host link to the home folder).
-void AddLinks(Snapshot& snapshot, const std::string& label, const std::wstring& folder) {
-    for (const std::wstring& name : ListDir(folder)) {
-        if (Matches("*.lnk", Narrow(name).c_str())) {
-            snapshot[label + "\\" + Narrow(name)] = ReadFileBytes(JoinPath(folder, name));
-        }
-    }
-}
-
 void AddKey(Snapshot& snapshot, const std::string& label, HKEY root, const std::wstring& key,
             REGSAM view = 0) {
     HKEY opened = nullptr;
@@ -207,8 +198,8 @@ public:
         AddFiles(snapshot, "ProgramData", JoinPath(CommonAppData(), L"Mirovan"));
         AddFiles(snapshot, "Programs", ShellFolder(CSIDL_PROGRAMS));
         AddFiles(snapshot, "CommonPrograms", ShellFolder(CSIDL_COMMON_PROGRAMS));
-        AddLinks(snapshot, "Desktop", ShellFolder(CSIDL_DESKTOPDIRECTORY));
-        AddLinks(snapshot, "CommonDesktop", ShellFolder(CSIDL_COMMON_DESKTOPDIRECTORY));
+        AddFiles(snapshot, "Desktop", ShellFolder(CSIDL_DESKTOPDIRECTORY));
+        AddFiles(snapshot, "CommonDesktop", ShellFolder(CSIDL_COMMON_DESKTOPDIRECTORY));
         for (REGSAM view : {REGSAM(0), REGSAM(KEY_WOW64_64KEY)}) {
             std::string bits = view == 0 ? "" : "64";
             AddKey(snapshot, "HKLM" + bits + "\\Mirovan", HKEY_LOCAL_MACHINE, L"SOFTWARE\\Mirovan",
@@ -259,8 +250,7 @@ public:
         return lines;
     }
     bool Logged(const std::string& message) const {
-        std::string log = ReadFileBytes(m_trace);
-        return log.find(message) != std::string::npos;
+        return ReadFileBytes(m_trace).find(message) != std::string::npos;
     }
 
     // A file a bad road holds open, as a running Notes client does.
