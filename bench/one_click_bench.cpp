@@ -20,15 +20,16 @@ namespace {
 double StartToCall(const std::wstring& exe, const std::wstring& callsLog) {
     DeleteFileW(callsLog.c_str());
     std::wstring line = L"\"" + exe + L"\" <CmdLine><Action>JoinMeeting</Action></CmdLine>";
-    std::vector<wchar_t> environment = BuildEnvironmentBlock({{L"QM_FAKE_CALLS_LOG", callsLog},
-                                                              {L"QM_FAKE_STAMP_CALLS", L"1"},
-                                                              {L"QM_FAKE_TRACE_LOG", L""}});
+    // The program inherits this process's variables.
+    SetEnvironmentVariableW(L"QM_FAKE_CALLS_LOG", callsLog.c_str());
+    SetEnvironmentVariableW(L"QM_FAKE_STAMP_CALLS", L"1");
+    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);
     STARTUPINFOW startup = {};
     startup.cb = sizeof(startup);
     PROCESS_INFORMATION process = {};
     double start = NowMilliseconds();
-    if (!CreateProcessW(nullptr, &line[0], nullptr, nullptr, FALSE, CREATE_UNICODE_ENVIRONMENT,
-                        environment.data(), nullptr, &startup, &process)) {
+    if (!CreateProcessW(nullptr, &line[0], nullptr, nullptr, FALSE, 0, nullptr, nullptr, &startup,
+                        &process)) {
         return -1;
     }
     WaitForSingleObject(process.hProcess, 60000);

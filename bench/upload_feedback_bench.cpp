@@ -23,12 +23,12 @@ const int kIslandDelayMs = 300;
 
 void RunProgram(const std::wstring& exe, const std::wstring& arguments) {
     std::wstring line = L"\"" + exe + L"\" " + arguments;
-    std::vector<wchar_t> environment = BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", L""}});
+    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);  // inherited by the program
     STARTUPINFOW startup = {};
     startup.cb = sizeof(startup);
     PROCESS_INFORMATION process = {};
-    if (CreateProcessW(nullptr, &line[0], nullptr, nullptr, FALSE, CREATE_UNICODE_ENVIRONMENT,
-                       environment.data(), nullptr, &startup, &process)) {
+    if (CreateProcessW(nullptr, &line[0], nullptr, nullptr, FALSE, 0, nullptr, nullptr, &startup,
+                       &process)) {
         WaitForSingleObject(process.hProcess, 60000);
         CloseHandle(process.hThread);
         CloseHandle(process.hProcess);

@@ -41,7 +41,7 @@ void PrintRecordText(const std::string& text) {
 }
 
 void PrintRecords(const std::wstring& traceLog) {
-    for (const TraceRecord& record : ParseTraceLog(ReadFileBytes(traceLog))) {
+    for (const TraceRecord& record : ReadTraceLog(traceLog)) {
         printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
         PrintRecordText(record.text);
         printf("\n");
@@ -116,16 +116,14 @@ int wmain(int argc, wchar_t** argv) {
         size_t received = caller.Received().size();
         printf("\n$ qmMrvONI.exe %s\n", Narrow(arguments).c_str());
         DeleteFileW(traceLog.c_str());
-        RunResult run;
         const std::vector<std::wstring> users = Listed(L"QM_DEMO_WATCH_HIVES");
         EntryStop unload(reinterpret_cast<const void*>(
                              GetProcAddress(GetModuleHandleW(L"advapi32.dll"), "RegUnLoadKeyW")),
                          [&users] { PrintLoadedHives(users); });
         DebuggeeHooks hooks;
         hooks.stop = users.empty() ? nullptr : &unload;
-        RunAsDebuggee(L"\"" + program + L"\" " + arguments,
-                      BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", traceLog}}), folder, 120000,
-                      &run, hooks);
+        SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", traceLog.c_str());  // for the program
+        RunResult run = RunDebuggee(L"\"" + program + L"\" " + arguments, folder, 120000, hooks);
         AwaitStartedPrograms();
         PrintRecords(traceLog);
         std::vector<CopyData> messages = caller.Received();

@@ -122,9 +122,9 @@ TEST_F(InstallerRegistrationTest, InstallerCheckLibraryIsCalledFromTheSuiteFolde
     // folder it was started in.
     RegRemoveTree(kMachine, L"SOFTWARE\\Mirovan");
     DeleteFileW(calls.c_str());
-    RunResult run;
-    RunAsDebuggee(L"\"" + Program().exePath() + L"\" -modifyadminmsidisplayversion",
-                  BuildEnvironmentBlock({{L"QM_FAKE_CALLS_LOG", calls}}), suite, 60000, &run);
+    SetEnvironmentVariableW(L"QM_FAKE_CALLS_LOG", calls.c_str());  // for the program
+    RunDebuggee(L"\"" + Program().exePath() + L"\" -modifyadminmsidisplayversion", suite, 60000);
+    SetEnvironmentVariableW(L"QM_FAKE_CALLS_LOG", nullptr);
     EXPECT_EQ("", calledFrom());
     CopyFileW(FakePath(L"qminstck.dll").c_str(), (Program().folder() + L"\\qminstck.dll").c_str(),
               FALSE);

@@ -223,10 +223,8 @@ public:
     // msiexec's exit code; the program's trace records go to the trace log.
     int Msiexec(const std::wstring& arguments) {
         DeleteFileW(m_trace.c_str());
-        RunResult run;
-        RunAsDebuggee(L"msiexec.exe " + arguments + L" /qn",
-                      BuildEnvironmentBlock({{L"QM_FAKE_TRACE_LOG", m_trace}}), L"", 300000, &run);
-        return run.exitCode;
+        SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", m_trace.c_str());  // for the custom actions
+        return RunDebuggee(L"msiexec.exe " + arguments + L" /qn", L"", 300000).exitCode;
     }
     // Installs (or repairs) and uninstalls; the custom actions run in order.
     void Install() {
@@ -241,7 +239,7 @@ public:
     std::vector<std::string> CommandLines() const {
         const std::string kEntry = "NIHandle lpCmdLine=";
         std::vector<std::string> lines;
-        for (const TraceRecord& record : ParseTraceLog(ReadFileBytes(m_trace))) {
+        for (const TraceRecord& record : ReadTraceLog(m_trace)) {
             if (record.text.compare(0, kEntry.size(), kEntry) == 0) {
                 lines.push_back(
                     record.text.substr(kEntry.size(), record.text.find(',') - kEntry.size()));

@@ -1,46 +1,32 @@
 // A simulated machine for the Sametime keywords: a suite folder holding the
 // feature's files, Sametime Connect found through an uninstall entry, Notes 8
-// with its program and data folders, and the two per-user Sametime 8
-// configuration profiles.
+// with its program and data folders.
 #pragma once
-
-#include <windows.h>
-#include <gtest/gtest.h>
-
-#include <string>
-#include <vector>
 
 #include "tests/support/file_util.h"
 #include "tests/support/held_files.h"
 #include "tests/support/machine_fixture.h"
-#include "tests/support/registry_util.h"
 
 namespace sametime_test {
 
 const wchar_t kNotes8Key[] = L"SOFTWARE\\Lotus\\Notes\\8.0";
-const wchar_t kUninstallEntry[] =
-    L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\QMTestSametimeConnect";
-
 const wchar_t kNativeLibrary[] = L"qmmrvjni.dll";
 const wchar_t kRuntimeC[] = L"msvcr120.dll";
 const wchar_t kJar[] = L"com.mrv.realtime.meeting_1.0.1.jar";
 const wchar_t kFeatureXml[] = L"com.mrv.realtime.meeting.feature_1.0.1\\feature.xml";
-
+const char kFeatureId[] = "id=\"com.mrv.realtime.meeting.feature\"";
 // The feature element as the program writes it (attributes in this order).
 const char kFeatureElement[] =
     "<feature id=\"com.mrv.realtime.meeting.feature\" "
     "url=\"features/com.mrv.realtime.meeting.feature_1.0.1/\" version=\"1.0.1\"";
-const char kFeatureId[] = "id=\"com.mrv.realtime.meeting.feature\"";
 
 // A platform.xml with a base site and a second site at siteUrl holding
 // another feature and then `features`.
 inline std::string PlatformXml(const std::string& siteUrl, const std::string& features = "") {
-    return "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
-           "<config date=\"1300000000000\" transient=\"false\" version=\"3.0\">\n"
+    return "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<config version=\"3.0\">\n"
            "<site enabled=\"true\" url=\"platform:/base/\">\n"
            "<feature id=\"org.eclipse.rcp\" url=\"features/org.eclipse.rcp_3.4.0/\" "
-           "version=\"3.4.0\">\n</feature>\n</site>\n"
-           "<site enabled=\"true\" url=\"" +
+           "version=\"3.4.0\">\n</feature>\n</site>\n<site enabled=\"true\" url=\"" +
            siteUrl +
            "\">\n<feature id=\"com.example.chat\" url=\"features/com.example.chat_8.0.0/\" "
            "version=\"8.0.0\">\n</feature>\n" +
@@ -68,13 +54,13 @@ protected:
     }
     // Sametime Connect of the given major version (0: no version value).
     void InstallSametime(DWORD version, const std::wstring& location) {
-        ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, kUninstallEntry, L"DisplayName",
+        const std::wstring entry = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\" +
+                                   std::wstring(kTestUninstallPrefix) + L"SametimeConnect";
+        ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, entry, L"DisplayName",
                                  L"IBM Lotus Sametime Connect 8.5"));
-        ASSERT_TRUE(
-            RegPutString(HKEY_LOCAL_MACHINE, kUninstallEntry, L"InstallLocation", location));
-        if (version != 0) {
-            ASSERT_TRUE(RegPutDword(HKEY_LOCAL_MACHINE, kUninstallEntry, L"VersionMajor", version));
-        }
+        ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, entry, L"InstallLocation", location));
+        ASSERT_TRUE(version == 0 ||
+                    RegPutDword(HKEY_LOCAL_MACHINE, entry, L"VersionMajor", version));
     }
     void InstallSametime(DWORD version) { InstallSametime(version, m_sametime); }
     void InstallNotes8() {

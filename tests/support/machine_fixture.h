@@ -16,17 +16,15 @@
 
 extern const wchar_t kEnvironmentKey[];     // Session Manager\Environment
 extern const wchar_t kSessionManagerKey[];  // holds PendingFileRenameOperations
+// Uninstall entries that tests create are named with this prefix.
+extern const wchar_t kTestUninstallPrefix[];
 
 // Removes every key, value and per-user folder the simulated products use.
 void ClearProductState();
-
 // The user's roaming application-data folder of this prefix.
 std::wstring RoamingAppData();
 // The all-users application-data folder of this prefix.
 std::wstring CommonAppData();
-
-// Uninstall entries that tests create are named with this prefix.
-extern const wchar_t kTestUninstallPrefix[];
 
 class MachineTest : public ::testing::Test {
 protected:

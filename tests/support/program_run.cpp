@@ -1,39 +1,29 @@
 #include "tests/support/program_run.h"
 
 #include <algorithm>
-#include <cstdlib>
-#include <cwctype>
+#include <cstdio>
 
 #include "tests/support/entry_stop.h"
 #include "tests/support/file_util.h"
 #include "tests/support/test_paths.h"
 
-std::vector<TraceRecord> ParseTraceLog(const std::string& bytes) {
+std::vector<TraceRecord> ReadTraceLog(const std::wstring& path) {
+    // Each record is "<entry> <level> <tag> <length>\n<text>\n".
+    const std::string bytes = ReadFileBytes(path);
     std::vector<TraceRecord> records;
-    size_t pos = 0;
-    while (pos < bytes.size()) {
-        size_t lineEnd = bytes.find('\n', pos);
-        if (lineEnd == std::string::npos) {
-            break;
-        }
-        std::string header = bytes.substr(pos, lineEnd - pos);
-        TraceRecord record;
+    for (size_t pos = 0; pos < bytes.size();) {
         char entry[32] = {}, tag[32] = {};
         unsigned long level = 0;
         unsigned length = 0;
-        if (sscanf(header.c_str(), "%31s %lu %31s %u", entry, &level, tag, &length) != 4) {
+        size_t lineEnd = bytes.find('\n', pos);
+        if (lineEnd == std::string::npos ||
+            sscanf(bytes.substr(pos, lineEnd - pos).c_str(), "%31s %lu %31s %u", entry, &level, tag,
+                   &length) != 4 ||
+            lineEnd + 1 + length > bytes.size()) {
             break;
         }
-        record.entry = entry;
-        record.level = level;
-        record.tag = tag;
-        pos = lineEnd + 1;
-        if (pos + length > bytes.size()) {
-            break;
-        }
-        record.text = bytes.substr(pos, length);
-        pos += length + 1;  // the text and its separating line feed
-        records.push_back(record);
+        records.push_back({entry, level, tag, bytes.substr(lineEnd + 1, length)});
+        pos = lineEnd + 1 + length + 1;
     }
     return records;
 }
@@ -63,185 +53,120 @@ bool RunResult::HasDebugOutput(const std::string& text) const {
 
 namespace {
 
-std::wstring UpperCase(std::wstring text) {
-    for (wchar_t& ch : text) {
-        ch = static_cast<wchar_t>(towupper(ch));
-    }
-    return text;
-}
-
 std::string ReadDebugString(HANDLE process, const OUTPUT_DEBUG_STRING_INFO& info) {
-    SIZE_T length = info.nDebugStringLength;
-    if (length == 0 || length > (1u << 20)) {
-        return std::string();
-    }
-    std::string text;
-    if (info.fUnicode) {
-        std::wstring wide(length, L'\0');
-        SIZE_T got = 0;
-        ReadProcessMemory(process, info.lpDebugStringData, &wide[0], length * sizeof(wchar_t),
-                          &got);
-        wide.resize(got / sizeof(wchar_t));
-        text = Narrow(wide);
-    } else {
-        text.assign(length, '\0');
-        SIZE_T got = 0;
-        ReadProcessMemory(process, info.lpDebugStringData, &text[0], length, &got);
-        text.resize(got);
-    }
-    while (!text.empty() && text.back() == '\0') {
-        text.pop_back();
-    }
-    return text;
+    std::vector<wchar_t> text(std::min<SIZE_T>(info.nDebugStringLength, 1u << 20) + 1, L'\0');
+    SIZE_T unit = info.fUnicode ? sizeof(wchar_t) : 1;
+    ReadProcessMemory(process, info.lpDebugStringData, text.data(), (text.size() - 1) * unit,
+                      nullptr);
+    return info.fUnicode ? Narrow(text.data()) : reinterpret_cast<const char*>(text.data());
 }
 
 }  // namespace
 
-std::vector<wchar_t> BuildEnvironmentBlock(const std::map<std::wstring, std::wstring>& overrides) {
-    std::map<std::wstring, std::pair<std::wstring, std::wstring>> byUpperName;
-    wchar_t* strings = GetEnvironmentStringsW();
-    for (const wchar_t* p = strings; p && *p; p += wcslen(p) + 1) {
-        std::wstring entry = p;
-        size_t eq = entry.find(L'=', 1);
-        if (eq == std::wstring::npos) {
-            continue;
-        }
-        std::wstring name = entry.substr(0, eq);
-        byUpperName[UpperCase(name)] = {name, entry.substr(eq + 1)};
-    }
-    FreeEnvironmentStringsW(strings);
-    for (const auto& item : overrides) {
-        if (item.second.empty()) {
-            byUpperName.erase(UpperCase(item.first));
-        } else {
-            byUpperName[UpperCase(item.first)] = {item.first, item.second};
-        }
-    }
-    std::vector<wchar_t> block;
-    for (const auto& item : byUpperName) {
-        std::wstring entry = item.second.first + L"=" + item.second.second;
-        block.insert(block.end(), entry.begin(), entry.end());
-        block.push_back(L'\0');
-    }
-    block.push_back(L'\0');
-    return block;
-}
-
-void RunAsDebuggee(const std::wstring& commandLine, const std::vector<wchar_t>& environment,
-                   const std::wstring& workingDir, DWORD timeoutMs, RunResult* result,
-                   const DebuggeeHooks& hooks) {
-    std::vector<wchar_t> mutableLine(commandLine.begin(), commandLine.end());
-    mutableLine.push_back(L'\0');
+RunResult RunDebuggee(const std::wstring& commandLine, const std::wstring& workingDir,
+                      DWORD timeoutMs, const DebuggeeHooks& hooks) {
+    RunResult result;
+    std::wstring line = commandLine;
     STARTUPINFOW startup = {};
     startup.cb = sizeof(startup);
     PROCESS_INFORMATION process = {};
-    const DWORD flags = DEBUG_ONLY_THIS_PROCESS | CREATE_UNICODE_ENVIRONMENT;
-    void* block = const_cast<wchar_t*>(environment.data());
-    const wchar_t* folder = workingDir.empty() ? nullptr : workingDir.c_str();
-    BOOL created =
+    const bool created =
         hooks.token != nullptr
-            ? CreateProcessAsUserW(hooks.token, nullptr, mutableLine.data(), nullptr, nullptr,
-                                   FALSE, flags, block, folder, &startup, &process)
-            : CreateProcessW(nullptr, mutableLine.data(), nullptr, nullptr, FALSE, flags, block,
-                             folder, &startup, &process);
+            ? CreateProcessAsUserW(hooks.token, nullptr, &line[0], nullptr, nullptr, FALSE,
+                                   DEBUG_ONLY_THIS_PROCESS, nullptr, workingDir.c_str(), &startup,
+                                   &process)
+            : CreateProcessW(nullptr, &line[0], nullptr, nullptr, FALSE, DEBUG_ONLY_THIS_PROCESS,
+                             nullptr, workingDir.c_str(), &startup, &process);
     if (!created) {
-        result->exitCode = -9999;
-        result->crashed = true;
-        return;
+        result.exitCode = -9999;
+        result.crashed = true;
+        return result;
     }
-    DWORD start = GetTickCount();
-    bool exited = false;
-    bool killed = false;
-    while (!exited) {
+    const DWORD start = GetTickCount();
+    for (bool exited = false; !exited;) {
         DEBUG_EVENT event;
         if (!WaitForDebugEvent(&event, 200)) {
-            if (!killed && GetTickCount() - start > timeoutMs) {
+            if (!result.timedOut && GetTickCount() - start > timeoutMs) {
                 TerminateProcess(process.hProcess, 0xDEAD);
-                killed = true;
-                result->timedOut = true;
+                result.timedOut = true;
             }
             continue;
         }
-        DWORD continueStatus = DBG_CONTINUE;
+        DWORD status = DBG_CONTINUE;
         switch (event.dwDebugEventCode) {
             case OUTPUT_DEBUG_STRING_EVENT:
-                result->debugOutput.push_back(
+                result.debugOutput.push_back(
                     ReadDebugString(process.hProcess, event.u.DebugString));
                 break;
             case EXCEPTION_DEBUG_EVENT: {
                 if (hooks.stop != nullptr && hooks.stop->OnException(process.hProcess, event)) {
                     break;
                 }
-                const EXCEPTION_RECORD& record = event.u.Exception.ExceptionRecord;
-                if (record.ExceptionCode == EXCEPTION_BREAKPOINT ||
-                    record.ExceptionCode == 0x4000001F /* WOW64 breakpoint */) {
-                    break;
-                }
-                continueStatus = DBG_EXCEPTION_NOT_HANDLED;
-                if (event.u.Exception.dwFirstChance) {
-                    result->firstChanceExceptions.push_back(record.ExceptionCode);
-                } else {
-                    result->crashed = true;
+                const DWORD code = event.u.Exception.ExceptionRecord.ExceptionCode;
+                if (code != EXCEPTION_BREAKPOINT && code != 0x4000001F /* WOW64 breakpoint */) {
+                    status = DBG_EXCEPTION_NOT_HANDLED;
+                    result.crashed = result.crashed || !event.u.Exception.dwFirstChance;
                 }
                 break;
             }
             case CREATE_PROCESS_DEBUG_EVENT:
-                if (event.u.CreateProcessInfo.hFile) {
-                    CloseHandle(event.u.CreateProcessInfo.hFile);
-                }
+                CloseHandle(event.u.CreateProcessInfo.hFile);
                 break;
             case LOAD_DLL_DEBUG_EVENT:
-                if (event.u.LoadDll.hFile) {
-                    CloseHandle(event.u.LoadDll.hFile);
-                }
+                CloseHandle(event.u.LoadDll.hFile);
                 break;
             case EXIT_PROCESS_DEBUG_EVENT:
-                result->exitCode = static_cast<int>(event.u.ExitProcess.dwExitCode);
+                result.exitCode = static_cast<int>(event.u.ExitProcess.dwExitCode);
                 exited = true;
                 break;
-            default:
-                break;
         }
-        ContinueDebugEvent(event.dwProcessId, event.dwThreadId, continueStatus);
+        ContinueDebugEvent(event.dwProcessId, event.dwThreadId, status);
     }
     CloseHandle(process.hThread);
     CloseHandle(process.hProcess);
+    return result;
 }
 
 ProgramUnderTest::ProgramUnderTest(const std::wstring& folder, const ProgramOptions& options)
     : m_folder(folder), m_exePath(JoinPath(folder, options.exeName)) {
     MakeDirs(m_folder);
     CopyFileW(BuiltProgramPath().c_str(), m_exePath.c_str(), FALSE);
-    if (options.traceLibrary == TraceLibrary::kBoth) {
-        CopyFileW(FakePath(L"mrvtrace.dll").c_str(), JoinPath(folder, L"mrvtrace.dll").c_str(),
-                  FALSE);
-    } else if (options.traceLibrary == TraceLibrary::kRawOnly) {
-        CopyFileW(FakePath(L"rawonly\\mrvtrace.dll").c_str(),
-                  JoinPath(folder, L"mrvtrace.dll").c_str(), FALSE);
+    const std::wstring trace = JoinPath(folder, L"mrvtrace.dll");
+    if (options.traceLibrary != TraceLibrary::kNone) {
+        const wchar_t* built = options.traceLibrary == TraceLibrary::kBoth
+                                   ? L"mrvtrace.dll"
+                                   : L"rawonly\\mrvtrace.dll";
+        CopyFileW(FakePath(built).c_str(), trace.c_str(), FALSE);
     }
     if (options.withSuiteLibrary) {
         CopyFileW(FakePath(L"qmusredt.dll").c_str(), JoinPath(folder, L"qmusredt.dll").c_str(),
                   FALSE);
     }
-    m_env[L"QM_FAKE_TRACE_LOG"] = traceLogPath();
+    m_env[L"QM_FAKE_TRACE_LOG"] = folder + L"\\trace.log";
     m_env[L"QM_FAKE_CALLS_LOG"] = callsLogPath();
 }
 
 RunResult ProgramUnderTest::Run(const std::wstring& arguments, DWORD timeoutMs,
                                 const DebuggeeHooks& hooks) {
-    std::wstring line = L"\"" + m_exePath + L"\"";
-    if (!arguments.empty()) {
-        line += L" " + arguments;
-    }
-    return RunRaw(line, timeoutMs, hooks);
+    return RunRaw(L"\"" + m_exePath + L"\"" + (arguments.empty() ? L"" : L" " + arguments),
+                  timeoutMs, hooks);
 }
 
 RunResult ProgramUnderTest::RunRaw(const std::wstring& commandLine, DWORD timeoutMs,
                                    const DebuggeeHooks& hooks) {
-    DeleteFileW(traceLogPath().c_str());
+    // The program inherits this process's environment, changed for the run.
+    std::map<std::wstring, std::wstring> saved;
+    for (const auto& [name, value] : m_env) {
+        std::vector<wchar_t> old(32768);
+        saved[name] = GetEnvironmentVariableW(name.c_str(), old.data(), 32768) ? old.data() : L"";
+        SetEnvironmentVariableW(name.c_str(), value.empty() ? nullptr : value.c_str());
+    }
+    DeleteFileW(m_env[L"QM_FAKE_TRACE_LOG"].c_str());
     DeleteFileW(callsLogPath().c_str());
-    RunResult result;
-    RunAsDebuggee(commandLine, BuildEnvironmentBlock(m_env), m_folder, timeoutMs, &result, hooks);
-    result.traces = ParseTraceLog(ReadFileBytes(traceLogPath()));
+    RunResult result = RunDebuggee(commandLine, m_folder, timeoutMs, hooks);
+    result.traces = ReadTraceLog(m_env[L"QM_FAKE_TRACE_LOG"]);
+    for (const auto& [name, value] : saved) {
+        SetEnvironmentVariableW(name.c_str(), value.empty() ? nullptr : value.c_str());
+    }
     return result;
 }

@@ -1,7 +1,5 @@
-// Runs qmMrvONI.exe the way an installer does, from a scratch install folder
-// that also holds the test stand-ins, and collects what it did: the exit
-// code, its debugger output (the program runs as a debuggee) and the records
-// the trace stand-in received.
+// Runs qmMrvONI.exe as an installer does, from a scratch folder that also holds
+// the stand-ins, and collects its exit code, debugger output and trace records.
 #pragma once
 
 #include <windows.h>
@@ -17,21 +15,18 @@ struct TraceRecord {
     std::string text;
 };
 
-// Parses the stand-in's log format.
-std::vector<TraceRecord> ParseTraceLog(const std::string& bytes);
+// The records of a trace stand-in's log file.
+std::vector<TraceRecord> ReadTraceLog(const std::wstring& path);
 
 struct RunResult {
     int exitCode = 0;
     bool timedOut = false;
-    bool crashed = false;  // an exception reached the last chance
+    bool crashed = false;  // an exception reached its last chance
     std::vector<std::string> debugOutput;
     std::vector<TraceRecord> traces;
-    std::vector<DWORD> firstChanceExceptions;
 
-    // The texts of all records, joined.
-    std::string TraceText() const;
-    // Records whose text equals `text` exactly.
-    int CountTraces(const std::string& text) const;
+    std::string TraceText() const;                   // the texts of all records, joined
+    int CountTraces(const std::string& text) const;  // records whose text is exactly `text`
     bool HasTrace(const std::string& text) const { return CountTraces(text) > 0; }
     bool HasTraceContaining(const std::string& part) const;
     bool HasDebugOutput(const std::string& text) const;
@@ -45,6 +40,11 @@ struct DebuggeeHooks {
     HANDLE token = nullptr;
     EntryStop* stop = nullptr;
 };
+
+// Runs commandLine as a debuggee in workingDir until it ends (or is killed
+// after timeoutMs).
+RunResult RunDebuggee(const std::wstring& commandLine, const std::wstring& workingDir,
+                      DWORD timeoutMs, const DebuggeeHooks& hooks = {});
 
 enum class TraceLibrary {
     kBoth,     // exports both entry points
@@ -65,14 +65,12 @@ public:
 
     const std::wstring& folder() const { return m_folder; }
     const std::wstring& exePath() const { return m_exePath; }
-    std::wstring traceLogPath() const { return m_folder + L"\\trace.log"; }
     std::wstring callsLogPath() const { return m_folder + L"\\calls.log"; }
 
-    // Extra environment for every run.
+    // Extra environment for every run; an empty value removes the variable.
     void SetEnv(const std::wstring& name, const std::wstring& value) { m_env[name] = value; }
 
-    // Runs with `arguments` as the command line after the program name.
-    // Trace and calls logs are emptied first.
+    // Runs with `arguments` after the quoted program path, in its folder.
     RunResult Run(const std::wstring& arguments, DWORD timeoutMs = 60000,
                   const DebuggeeHooks& hooks = {});
     // Runs with exactly this command line (program name included).
@@ -84,13 +82,3 @@ private:
     std::wstring m_exePath;
     std::map<std::wstring, std::wstring> m_env;
 };
-
-// Environment block of this process with `overrides` applied (names compared
-// without regard to case).
-std::vector<wchar_t> BuildEnvironmentBlock(const std::map<std::wstring, std::wstring>& overrides);
-
-// Runs a command line as a debuggee until it exits (or is killed after
-// timeoutMs) and fills result (exit code, debugger output, exceptions).
-void RunAsDebuggee(const std::wstring& commandLine, const std::vector<wchar_t>& environment,
-                   const std::wstring& workingDir, DWORD timeoutMs, RunResult* result,
-                   const DebuggeeHooks& hooks = {});

@@ -21,8 +21,6 @@ bool RegHasValue(HKEY root, const std::wstring& key, const wchar_t* name, REGSAM
 // its inner terminators) and its type.
 std::optional<std::wstring> RegGetString(HKEY root, const std::wstring& key, const wchar_t* name,
                                          REGSAM view = 0, DWORD* type = nullptr);
-std::vector<std::wstring> RegGetMultiString(HKEY root, const std::wstring& key, const wchar_t* name,
-                                            REGSAM view = 0);
 std::optional<DWORD> RegGetDword(HKEY root, const std::wstring& key, const wchar_t* name,
                                  REGSAM view = 0);
 void RegRemoveTree(HKEY root, const std::wstring& key, REGSAM view = 0);

@@ -8,16 +8,10 @@ ScratchDir::ScratchDir(const wchar_t* tag) {
     static unsigned counter = 0;
     wchar_t temp[MAX_PATH] = {};
     GetTempPathW(MAX_PATH, temp);
-    wchar_t name[MAX_PATH];
-    for (;;) {
-        _snwprintf(name, MAX_PATH, L"%lsqm-%ls-%lu-%u", temp, tag, GetCurrentProcessId(),
-                   ++counter);
-        name[MAX_PATH - 1] = L'\0';
-        if (CreateDirectoryW(name, nullptr)) {
-            break;
-        }
-    }
-    m_path = name;
+    do {
+        m_path = std::wstring(temp) + L"qm-" + tag + L"-" + std::to_wstring(GetCurrentProcessId()) +
+                 L"-" + std::to_wstring(++counter);
+    } while (!CreateDirectoryW(m_path.c_str(), nullptr));
 }
 
 ScratchDir::~ScratchDir() {

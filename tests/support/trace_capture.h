@@ -3,6 +3,9 @@
 // named by QM_FAKE_TRACE_LOG, which this object points at a scratch file.
 #pragma once
 
+#include <windows.h>
+
+#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -11,18 +14,19 @@
 
 class TraceCapture {
 public:
-    TraceCapture();
-    ~TraceCapture();
+    TraceCapture() { SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", m_file.c_str()); }
+    ~TraceCapture() { SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr); }
     TraceCapture(const TraceCapture&) = delete;
     TraceCapture& operator=(const TraceCapture&) = delete;
 
-    std::vector<TraceRecord> Records() const;
-    // Texts of all records so far, in order.
-    std::vector<std::string> Texts() const;
-    bool Has(const std::string& text) const;
-    void Clear();
+    std::vector<TraceRecord> Records() const { return ReadTraceLog(m_file); }
+    bool Has(const std::string& text) const {
+        std::vector<TraceRecord> records = Records();
+        return std::any_of(records.begin(), records.end(),
+                           [&](const TraceRecord& r) { return r.text == text; });
+    }
 
 private:
-    ScratchDir m_dir;
-    std::wstring m_file;
+    ScratchDir m_dir{L"trace"};
+    std::wstring m_file = m_dir.Sub(L"trace.log");
 };
