@@ -60,11 +60,10 @@ protected:
         RegPutString(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Mirovan\\QmkTools", L"Path",
                      Program().folder());
     }
-    RunResult Install() {
+    void Install() {
         RunResult run = Program().Run(L"-mocvistainstall");
         EXPECT_FALSE(run.crashed);
         EXPECT_EQ(0, run.exitCode);
-        return run;
     }
     void Configure(const std::wstring& url) {
         ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, kCommunicatorKey, L"CustomStateURL", url));
@@ -97,11 +96,9 @@ TEST_F(CustomStatusTest, WithoutPolicyTheStatusFileIsInstalledOnce) {
         } else if (row.key == kLyncKey) {
             RegMakeKey(HKEY_LOCAL_MACHINE, kLyncKey);
         }
-        RunResult run = Install();
+        Install();
         EXPECT_EQ(L"file://" + row.status, RegGetString(row.root, row.key, L"CustomStateURL"));
         EXPECT_EQ(0u, RegGetDword(row.root, row.key, L"EnableSIPHighSecurityMode"));
-        EXPECT_EQ(row.root == HKEY_CURRENT_USER,
-                  run.HasTraceContaining("SilentInstall: write HKEY_CURRENT_USER!"));
         EXPECT_EQ(m_template, ReadFileBytes(row.status));
         const ULONGLONG written = WriteTime(row.status);
         Sleep(20);
@@ -118,29 +115,19 @@ TEST_F(CustomStatusTest, WithoutPolicyTheStatusFileIsInstalledOnce) {
 TEST_F(CustomStatusTest, ConfiguredFileGainsTheStateOnceOrIsLeftAlone) {
     const std::wstring secret = m_scratch.Sub(L"secret.txt");
     WriteFileBytes(secret, "SECRET");
-    const struct {
-        const char* name;
-        std::string content;
-        const char* refusal;  // null: the state is appended
-    } rows[] = {
-        {"other wording", kOtherWording, nullptr},
-        {"external entity",
-         "<!DOCTYPE customStates [<!ENTITY x SYSTEM \"file:///" + Narrow(secret) +
-             "\">]><customStates><customState ID=\"1\"><activity>&x;</activity></customState>"
-             "</customStates>",
-         "the file has a document type declaration"},
-        {"malformed", kOtherWording.substr(0, 200), "the file is not well-formed XML"},
-    };
+    const std::string entity =
+        "<!DOCTYPE customStates [<!ENTITY x SYSTEM \"file:///" + Narrow(secret) +
+        "\">]><customStates><customState ID=\"1\"><activity>&x;</activity></customState>"
+        "</customStates>";
     const std::wstring status = m_scratch.Sub(L"admin") + L"\\status.xml";
-    for (const auto& row : rows) {
-        SCOPED_TRACE(row.name);
-        WriteFileBytes(status, row.content);
+    for (const std::string& content : {kOtherWording, entity, kOtherWording.substr(0, 200)}) {
+        SCOPED_TRACE(content);
+        WriteFileBytes(status, content);
         Configure(L"file:///" + status);
-        RunResult run = Install();
+        Install();
         const std::string after = ReadFileBytes(status);
-        if (row.refusal != nullptr) {
-            EXPECT_TRUE(run.HasTraceContaining(row.refusal));
-            EXPECT_EQ(row.content, after);
+        if (content != kOtherWording) {
+            EXPECT_EQ(content, after);
             continue;
         }
         EXPECT_EQ(2u, Count(after, "ID=\"19780803\"")) << after;
@@ -190,8 +177,7 @@ TEST_F(CustomStatusTest, NoWorkGoesThroughALinkInTheUsersFolder) {
         if (existing) {
             WriteFileBytes(target, kOtherWording);
         }
-        RunResult run = Install();
-        EXPECT_TRUE(run.HasTraceContaining("refused to go through a reparse point"));
+        Install();
         EXPECT_EQ(existing ? kOtherWording : "", ReadFileBytes(target));
     }
 }
