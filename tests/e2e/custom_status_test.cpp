@@ -1,17 +1,18 @@
 // mocvistainstall run by the real program: the Communicator and Lync policy
 // values it writes, the suite's status files, and the files an administrator
-// configured, friendly or hostile.
+// configured, friendly or hostile. And the suite's version.
 #include <windows.h>
+#include <objbase.h>
 #include <sddl.h>
 #include <gtest/gtest.h>
 
 #include <string>
 
 #include "tests/support/file_util.h"
-#include "tests/support/host_link.h"
 #include "tests/support/machine_fixture.h"
 #include "tests/support/registry_util.h"
 #include "tests/support/test_paths.h"
+#include "version/qm_version.h"
 
 namespace {
 
@@ -164,22 +165,59 @@ TEST_F(CustomStatusTest, OnlyTheSuitesFoldersAreCreatedForAFileUrl) {
     EXPECT_FALSE(DirExists(m_scratch.Sub(L"d\\Other")));
 }
 
-// The user's "Mirovan" folder is a link: neither is the missing file made
-// through it nor an existing one rewritten.
-TEST_F(CustomStatusTest, NoWorkGoesThroughALinkInTheUsersFolder) {
-    const std::wstring victim = m_scratch.Sub(L"victim", true);
-    const std::wstring target = JoinPath(victim, L"Quillmark Tools\\status.xml");
-    HostLink link(JoinPath(RoamingAppData(), L"Mirovan"), victim);
-    ASSERT_TRUE(link.ok());
-    Configure(L"file://" + JoinPath(RoamingAppData(), kStatusFile));
-    for (bool existing : {false, true}) {
-        SCOPED_TRACE(existing ? "existing" : "missing");
-        if (existing) {
-            WriteFileBytes(target, kOtherWording);
+// The suite's version: QM.xml in the install folder first, then the user's
+// and the machine's "BuildNumber"; the install folder's "Path" from the
+// machine's 32-bit view, the user's key or the per-user uninstall entry.
+TEST_F(CustomStatusTest, SuiteVersionComesFromQmXmlThenTheUsersThenTheMachinesBuildNumber) {
+    const HKEY hklm = HKEY_LOCAL_MACHINE;
+    const HKEY hkcu = HKEY_CURRENT_USER;
+    const wchar_t* suiteKey = L"SOFTWARE\\Mirovan\\QmkTools";
+    const wchar_t* uninstallKey =
+        L"Software\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\QuillmarkTools";
+    const struct {
+        HKEY root;  // where the install folder's "Path" is
+        const wchar_t* key;
+        REGSAM view;
+        const wchar_t* uninstallString;  // written beside "Path" unless null
+        const char* version;             // in QM.xml, null: no file
+        const wchar_t* user;             // "BuildNumber" values, unless null
+        const wchar_t* machine;
+        const wchar_t* expected;  // null: not found
+    } rows[] = {
+        {hklm, suiteKey, 0, nullptr, "2.1.0.77", L"9", L"8", L"2.1.0.77"},
+        {hklm, suiteKey, 0, nullptr, "", L"3.0.1", L"8", L"3.0.1"},
+        {hklm, suiteKey, 0, nullptr, "", L"", L"4.0.2", L"4.0.2"},
+        {hklm, suiteKey, 0, nullptr, "&v;", nullptr, L"4.0.2", L"4.0.2"},  // a DTD defines v
+        {hkcu, suiteKey, 0, nullptr, "2.2", nullptr, nullptr, L"2.2"},
+        {hkcu, uninstallKey, 0, L"x /uninstall", "2.3", nullptr, nullptr, L"2.3"},
+        {hkcu, uninstallKey, 0, L"", "2.3", nullptr, nullptr, nullptr},
+        {hklm, suiteKey, KEY_WOW64_64KEY, nullptr, "2.4", nullptr, nullptr, nullptr},
+    };
+    CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED);
+    const std::wstring suite = m_scratch.Sub(L"suite", true);
+    for (const auto& row : rows) {
+        SCOPED_TRACE(Narrow(row.key) + " " + row.version);
+        ClearProductState();
+        RegPutString(row.root, row.key, L"Path", suite, row.view);
+        if (row.uninstallString != nullptr) {
+            RegPutString(row.root, row.key, L"UninstallString", row.uninstallString);
         }
-        Install();
-        EXPECT_EQ(existing ? kOtherWording : "", ReadFileBytes(target));
+        const std::string doctype =
+            std::string(row.version) == "&v;" ? "<!DOCTYPE QM [<!ENTITY v \"6.6\">]>" : "";
+        WriteFileBytes(JoinPath(suite, L"QM.xml"),
+                       "<?xml version=\"1.0\"?>" + doctype + "<QM><VersionInfo><CurrentVersion>" +
+                           row.version + "</CurrentVersion></VersionInfo></QM>");
+        if (row.user != nullptr) {
+            RegPutString(hkcu, suiteKey, L"BuildNumber", row.user);
+        }
+        if (row.machine != nullptr) {
+            RegPutString(hklm, suiteKey, L"BuildNumber", row.machine, KEY_WOW64_32KEY);
+        }
+        CStringEx version(L"stale");
+        EXPECT_EQ(row.expected != nullptr, GetQMBuildNumber(version) != FALSE);
+        EXPECT_STREQ(row.expected ? row.expected : L"", version.c_str());
     }
+    CoUninitialize();
 }
 
 }  // namespace
