@@ -1,11 +1,13 @@
-// What older releases left behind: the old Outlook integration's files (at the
-// next restart), update leftovers, a retired COM registration, and the 64-bit
-// add-ins, unregistered for real by the 64-bit regsvr32.
+// What older releases left behind: the old integrations' Windows Installer
+// registrations (by upgrade code), the old Outlook integration's files (at
+// the next restart), update leftovers, a retired COM registration, and the
+// 64-bit add-ins, unregistered for real by the 64-bit regsvr32.
 #include <windows.h>
 #include <gtest/gtest.h>
 
 #include <string>
 
+#include "cleanup/packed_guid.h"
 #include "tests/support/file_util.h"
 #include "tests/support/held_files.h"
 #include "tests/support/machine_fixture.h"
@@ -13,29 +15,149 @@
 
 namespace {
 
+const HKEY kUser = HKEY_CURRENT_USER;
 const HKEY kMachine = HKEY_LOCAL_MACHINE;
+const std::wstring kNotesCode = L"UpgradeCodes\\39A1EB3B91C93B54EAD80FE3C665084C";
+const std::wstring kOutlookCode = L"UpgradeCodes\\E4698B57199D4B241AF129150B2CCAE2";
+const std::wstring kCopies = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Installer\\";
+const std::wstring kUninstall = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\";
+// Packed and braced product codes: two listed under the upgrade code, one not.
+const std::wstring kProducts[][2] = {
+    {L"0123456789ABCDEF0123456789ABCDEF", L"{76543210-BA98-FEDC-1032-547698BADCFE}"},
+    {L"FEDCBA9876543210FEDCBA9876543210", L"{89ABCDEF-4567-0123-EFCD-AB8967452301}"},
+    {L"AAAAAAAABBBBCCCCDDDDEEEEEEEEEEEE", L"{AAAAAAAA-BBBB-CCCC-DDDD-EEEEEEEEEEEE}"}};
 const std::wstring kOldServer = L"CLSID\\{061E7FF2-9750-46FB-AFD6-245CE0AB8549}";
 const std::wstring kToolbarClass = L"{90E2BA2E-DD1B-4cde-9134-7A8B86D33CA7}";
 const std::wstring kToolbar = L"SOFTWARE\\Microsoft\\Internet Explorer\\Toolbar";
 const std::wstring kToolbarKey = L"SOFTWARE\\Classes\\CLSID\\" + kToolbarClass;
 
+std::wstring Installer(HKEY root) {
+    return root == kUser ? L"SOFTWARE\\Microsoft\\Installer\\" : L"SOFTWARE\\Classes\\Installer\\";
+}
+
+// A product's "Products" (part 0) or "Features" (1) key, or its uninstall entry (2).
+std::wstring Entry(HKEY root, int product, int part) {
+    const wchar_t* lists[] = {L"Products\\", L"Features\\"};
+    return part < 2 ? Installer(root) + lists[part] + kProducts[product][0]
+                    : kUninstall + kProducts[product][1];
+}
+
 class LegacyRemovalTest : public MachineTest {
 protected:
-    LegacyRemovalTest() : m_suite(m_scratch.Sub(L"suite", true)) {
+    LegacyRemovalTest() {
         RegPutString(kMachine, L"SOFTWARE\\Mirovan\\QmkTools", L"Path", m_suite);
     }
     ~LegacyRemovalTest() override {
+        for (HKEY root : {kUser, kMachine}) {
+            for (int entry = 0; entry < 9; ++entry) {
+                RegRemoveTree(root, Entry(root, entry / 3, entry % 3));
+            }
+            for (const std::wstring& code : {kNotesCode, kOutlookCode}) {
+                RegRemoveTree(root, Installer(root) + code);
+                RegRemoveTree(kMachine, kCopies + code);
+            }
+        }
         RegRemoveTree(HKEY_CLASSES_ROOT, kOldServer);
         RegRemoveTree(kMachine, kToolbarKey);
         RegRemoveValue(kMachine, kToolbar, kToolbarClass.c_str());
         RegRemoveValue(kMachine, kToolbar, L"QMTest-Neighbour");
     }
-    void AddAddin(const wchar_t* name) {
-        CopyFileW(FakePath(L"addin64.dll").c_str(), JoinPath(m_suite, name).c_str(), FALSE);
+    // The products' entries under root, the first two listed under the code.
+    static void Register(HKEY root, const std::wstring& code, int products) {
+        for (int product = 0; product < products; ++product) {
+            for (int part = 0; part < 3; ++part) {
+                RegPutString(root, Entry(root, product, part) + L"\\Sub", L"v", L"x");
+            }
+            if (product < 2) {
+                RegPutString(root, Installer(root) + code, kProducts[product][0].c_str(), L"");
+            }
+        }
+    }
+    static int EntriesLeft(HKEY root, int product) {
+        return RegHasKey(root, Entry(root, product, 0)) + RegHasKey(root, Entry(root, product, 1)) +
+               RegHasKey(root, Entry(root, product, 2));
+    }
+    void Put(const wchar_t* fake, const std::wstring& folder, const wchar_t* name) {
+        CopyFileW(FakePath(fake).c_str(), JoinPath(folder, name).c_str(), FALSE);
     }
 
-    const std::wstring m_suite;
+    const std::wstring m_suite = m_scratch.Sub(L"suite", true);
 };
+
+TEST(PackedGuidTest, BothFormsFollowTheInstallerRuleAndTheCheckedOneRefusesOtherLengths) {
+    const wchar_t* const cases[][2] = {
+        {L"39A1EB3B91C93B54EAD80FE3C665084C", L"{B3BE1A93-9C19-45B3-AE8D-F03E6C5680C4}"},
+        {L"E4698B57199D4B241AF129150B2CCAE2", L"{75B8964E-D991-42B4-A11F-9251B0C2AC2E}"},
+        {L"39A1EB3B91C93B54EAD80FE3C665084", nullptr},
+        {L"39A1EB3B91C93B54EAD80FE3C665084CD", nullptr}};
+    for (const auto& c : cases) {
+        wchar_t out[39] = L"stale";
+        EXPECT_EQ(c[1] != nullptr, PackedGuidStringToGuid(c[0], out, 39));
+        EXPECT_EQ(std::wstring(c[1] ? c[1] : L""), out);
+        if (c[1] != nullptr) {
+            EXPECT_FALSE(PackedGuidToGuid(c[0], out, 38));  // no room for the terminator
+        }
+    }
+}
+
+TEST_F(LegacyRemovalTest, ListedProductsGoThenTheUpgradeCode) {
+    for (const wchar_t* keyword : {L"-uninstalloldni", L"-smsdeloldnicuruserkey"}) {
+        const bool machineToo = keyword[1] == L'u';
+        for (HKEY root : {kUser, kMachine}) {
+            Register(root, kNotesCode, 3);
+        }
+        RegMakeKey(kMachine, kCopies + kNotesCode + L"\\Sub");
+        Program().Run(keyword);
+        for (HKEY root : {kUser, kMachine}) {
+            SCOPED_TRACE(Narrow(keyword) + (root == kUser ? " user" : " machine"));
+            const bool cleaned = root == kUser || machineToo;
+            EXPECT_EQ(cleaned ? 0 : 3, EntriesLeft(root, 0));
+            EXPECT_EQ(cleaned ? 0 : 3, EntriesLeft(root, 1));
+            EXPECT_EQ(3, EntriesLeft(root, 2));
+            EXPECT_EQ(!cleaned, RegHasKey(root, Installer(root) + kNotesCode));
+        }
+        EXPECT_EQ(!machineToo, RegHasKey(kMachine, kCopies + kNotesCode));
+    }
+}
+
+// Neither the console user's registration nor the old Outlook integration's
+// class is there: the line, the machine's parts go all the same, no file is
+// touched.
+TEST_F(LegacyRemovalTest, UnregisteredCodeIsLoggedAndTheMachineCopyStillGoes) {
+    RegMakeKey(kUser, Installer(kUser) + L"Products");
+    Register(kMachine, kOutlookCode, 1);
+    RegMakeKey(kMachine, kCopies + kOutlookCode);
+    const size_t pending = PendingDeleteCount();
+    RunResult run = Program().Run(L"-uninstalloldoi");
+    EXPECT_TRUE(
+        run.HasTrace(" DelInstallerKeyByUpgrade: RegOpenKeyEx UpgradeID FAILED, Error = 2\n,\n"));
+    EXPECT_EQ(0, EntriesLeft(kMachine, 0));
+    EXPECT_FALSE(RegHasKey(kMachine, kCopies + kOutlookCode));
+    EXPECT_EQ(pending, PendingDeleteCount());
+}
+
+// From the suite's folder; without one by name from the program's folder,
+// never from the folder the program was started in.
+TEST_F(LegacyRemovalTest, InstallerCheckLibraryIsCalledFromTheSuiteFolder) {
+    const std::wstring calls = Program().callsLogPath();
+    auto called = [&calls](const std::wstring& folder) {
+        return ReadFileBytes(calls).find("ModifyAdminMsiVersion from " + Narrow(folder) +
+                                         "\\qminstck.dll\n") != std::string::npos;
+    };
+    Put(L"qminstck.dll", m_suite, L"qminstck.dll");
+    Program().Run(L"-modifyadminmsidisplayversion");
+    EXPECT_TRUE(called(m_suite));
+
+    RegRemoveTree(kMachine, L"SOFTWARE\\Mirovan");
+    DeleteFileW(calls.c_str());
+    SetEnvironmentVariableW(L"QM_FAKE_CALLS_LOG", calls.c_str());  // for the program
+    RunDebuggee(L"\"" + Program().exePath() + L"\" -modifyadminmsidisplayversion", m_suite, 60000);
+    SetEnvironmentVariableW(L"QM_FAKE_CALLS_LOG", nullptr);
+    EXPECT_FALSE(called(m_suite));
+    Put(L"qminstck.dll", Program().folder(), L"qminstck.dll");
+    Program().Run(L"-modifyadminmsidisplayversion");
+    EXPECT_TRUE(called(Program().folder()));
+}
 
 TEST_F(LegacyRemovalTest, OldOutlookFilesAndTheFolderAbove327GoAtRestart) {
     for (const wchar_t* row : {L"Mirovan\\327\\OI", L"Other\\3270\\OI"}) {
@@ -67,8 +189,8 @@ TEST_F(LegacyRemovalTest, UpdateLeftoversRetiredClassesAndAddinsGo) {
     RegPutString(kMachine, kToolbarKey + L"\\InprocServer32", L"", L"x");
     RegPutString(kMachine, kToolbar, kToolbarClass.c_str(), L"");
     RegPutString(kMachine, kToolbar, L"QMTest-Neighbour", L"");
-    AddAddin(L"qmolkadd64.dll");
-    AddAddin(L"qmMrvst64.dll");
+    Put(L"addin64.dll", m_suite, L"qmolkadd64.dll");
+    Put(L"addin64.dll", m_suite, L"qmMrvst64.dll");
 
     // This one changes nothing at all.
     Program().Run(L"-deleteregfeaturecontrol");
@@ -99,7 +221,7 @@ TEST_F(LegacyRemovalTest, Regsvr32ThatCannotStartIsLoggedAndNoErrorBoxWaits) {
     ASSERT_NE(0u, GetSystemWow64DirectoryW(system, MAX_PATH));
     const std::wstring regsvr32 = JoinPath(system, L"regsvr32.exe");
     const std::wstring saved = regsvr32 + L".qmsaved";
-    AddAddin(L"qmolkadd64.dll");
+    Put(L"addin64.dll", m_suite, L"qmolkadd64.dll");
     // Renamed, not rewritten: the prefix shares that file with its template.
     ASSERT_TRUE(MoveFileW(regsvr32.c_str(), saved.c_str()));
     WriteFileBytes(regsvr32, "not a program");
