@@ -1,7 +1,6 @@
 // The Notes plug-in's self-update run by the real program: the installed
-// program hands over to its temporary copy, the copy's hidden window speaks
-// with the stand-in updater and configuration tool, and the installed program
-// removes the copies at the end. SelfUpdateSlow runs as a test of its own.
+// program hands over to its temporary copy, which speaks with the stand-in
+// updater and configuration tool. SelfUpdateSlow runs as a test of its own.
 #include <gtest/gtest.h>
 
 #include "notes/plugin_file_lists.h"
@@ -107,9 +106,8 @@ TEST_F(SelfUpdate, TemporaryCopyCommitsOrRollsBackAndHandsOverToTheInstalledProg
             RegPutString(HKEY_CURRENT_USER, kSiteKey, L"sitename", c.siteName);
         }
         Copy();
-        for (const wchar_t* name : {L"qmnwcfg.exe", L"~TmpDown.exe"}) {
-            DeleteFileW(JoinPath(m_plugin, name).c_str());
-        }
+        DeleteFileW(JoinPath(m_plugin, L"qmnwcfg.exe").c_str());
+        DeleteFileW(JoinPath(m_plugin, L"~TmpDown.exe").c_str());
         if (c.configExit != kNoConfigTool) {
             Put(L"qmnwcfg.exe", m_plugin, L"qmnwcfg.exe");
         }
@@ -117,7 +115,6 @@ TEST_F(SelfUpdate, TemporaryCopyCommitsOrRollsBackAndHandsOverToTheInstalledProg
             Put(L"qmniupd.exe", m_plugin, L"~TmpDown.exe");
         }
         RunResult run = Run(Copy(), c.updater ? c.updater : L"", c.configExit, c.configDelayMs);
-
         EXPECT_EQ(c.exitCode, run.exitCode);
         // The updater's start: the window's handle, the site name, the Notes folder.
         EXPECT_EQ(c.updater ? 1 : 0,
@@ -134,18 +131,6 @@ TEST_F(SelfUpdate, TemporaryCopyCommitsOrRollsBackAndHandsOverToTheInstalledProg
     }
 }
 
-// A plug-in folder longer than a path: neither success, nor a write in the
-// current folder.
-TEST_F(SelfUpdate, InstalledProgramThatCannotStartItsCopyFailsAtOnce) {
-    RegPutString(HKEY_LOCAL_MACHINE, kNIKey, L"Path", m_plugin + L"\\" + std::wstring(300, L'n'));
-    Put(L"qmnwcfg.exe", m_notes, L"qmMrvONI.exe");
-    Put(L"qmniupd.exe", m_notes, L"qmniupd.exe");
-    Program().Run(L"-nosuchkeyword");  // leaves its logs, as the next run does
-    const std::vector<std::wstring> before = ListDir(Program().folder());
-    EXPECT_EQ(-1, Run(Program(), L"post-wait").exitCode);
-    EXPECT_EQ(before, ListDir(Program().folder()));
-}
-
 TEST_F(SelfUpdate, CommittedUpdateEndsWithTheCopiesGoneAndNotesCompleted) {
     ProgramUnderTest installed(m_notes);
     Put(L"qmniupd.exe", m_notes, L"qmniupd.exe");
@@ -156,7 +141,6 @@ TEST_F(SelfUpdate, CommittedUpdateEndsWithTheCopiesGoneAndNotesCompleted) {
     }
     WriteFileBytes(JoinPath(m_notes, L"qmnires.dll"), "notes' own");
     EXPECT_EQ(0, Run(installed, L"post-wait").exitCode);
-
     EXPECT_EQ(1, Count(m_calls, "~TmpDown.exe received: commit"));
     // The final run removed the copies and completed the Notes folder.
     EXPECT_FALSE(FileExists(JoinPath(m_plugin, L"~TmpDown.exe")) ||
@@ -171,7 +155,6 @@ TEST_F(SelfUpdateSlow, UpdaterThatNeverEndsIsTerminatedAfterThirtySeconds) {
     const DWORD start = GetTickCount();
     EXPECT_EQ(0, Run(Copy(), L"ignore", 0, 0, 90000).exitCode);
     const DWORD elapsed = GetTickCount() - start;
-
     EXPECT_TRUE(AwaitProcessesNamed(L"~TmpDown.exe", 5000));
     EXPECT_GE(elapsed, 29000u);
     EXPECT_LT(elapsed, 60000u);
