@@ -98,20 +98,17 @@ protected:
                        });
         RunResult run = Program().Run(L"-delunuseddata", 60000, {token, &stop});
         EXPECT_EQ(0, run.exitCode);
-        m_stops = stop.stops();
         return run;
     }
 
     std::wstring m_profiles;
     std::map<std::wstring, int> m_seen;
-    int m_stops = 0;
 };
 
 TEST_F(ProfileHivesTest, EveryLoadableHiveLosesTheKeyAndIsUnloaded) {
     HeldOpen loggedOn(Hive(L"QMTest-InUse"), 0);
     ASSERT_TRUE(loggedOn.ok());
     RunResult run = Run();
-
     // Cleaned while loaded, the other key kept, the planted link deleted as a
     // link: its machine target stays. Both unloaded again.
     EXPECT_EQ(2, m_seen[L"QMTest-A"]);
@@ -121,7 +118,6 @@ TEST_F(ProfileHivesTest, EveryLoadableHiveLosesTheKeyAndIsUnloaded) {
     // there, and the hive is unloaded all the same.
     EXPECT_EQ(1, m_seen[L"QMTest-Linked"]);
     EXPECT_TRUE(RegHasKey(HKEY_LOCAL_MACHINE, kMachineMirovan + L"\\QmkTools", KEY_WOW64_64KEY));
-    EXPECT_EQ(3, m_stops);
     for (const wchar_t* user : kUsers) {
         EXPECT_FALSE(RegHasKey(HKEY_USERS, user)) << Narrow(user);
     }
@@ -145,7 +141,7 @@ TEST_F(ProfileHivesTest, WithoutBackupAndRestorePrivilegesNothingIsRemoved) {
     CloseHandle(restricted);
     CloseHandle(own);
     EXPECT_TRUE(run.HasDebugOutput("NIHandle::DeleteAllCurUserReg: AdjustPrivileges failed.\n"));
-    EXPECT_EQ(0, m_stops);
+    EXPECT_TRUE(m_seen.empty());
     EXPECT_TRUE(RegHasKey(HKEY_CURRENT_USER, kQm));
 }
 
