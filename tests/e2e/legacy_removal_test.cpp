@@ -104,22 +104,6 @@ TEST_F(LegacyRemovalTest, ListedProductsGoThenTheUpgradeCode) {
     }
 }
 
-// Neither the console user's registration nor the old Outlook integration's
-// class is there: the line, the machine's parts go all the same, no file is
-// touched.
-TEST_F(LegacyRemovalTest, UnregisteredCodeIsLoggedAndTheMachineCopyStillGoes) {
-    RegMakeKey(kUser, Installer(kUser) + L"Products");
-    Register(kMachine, kOutlookCode, 1);
-    RegMakeKey(kMachine, kCopies + kOutlookCode);
-    const size_t pending = PendingDeleteCount();
-    RunResult run = Program().Run(L"-uninstalloldoi");
-    EXPECT_TRUE(
-        run.HasTrace(" DelInstallerKeyByUpgrade: RegOpenKeyEx UpgradeID FAILED, Error = 2\n,\n"));
-    EXPECT_EQ(0, EntriesLeft(kMachine, 0));
-    EXPECT_FALSE(RegHasKey(kMachine, kCopies + kOutlookCode));
-    EXPECT_EQ(pending, PendingDeleteCount());
-}
-
 TEST_F(LegacyRemovalTest, InstallerCheckLibraryIsCalledFromTheSuiteFolder) {
     Put(L"qminstck.dll", m_suite, L"qminstck.dll");
     Program().Run(L"-modifyadminmsidisplayversion");
@@ -128,22 +112,34 @@ TEST_F(LegacyRemovalTest, InstallerCheckLibraryIsCalledFromTheSuiteFolder) {
                   .find("ModifyAdminMsiVersion from " + Narrow(m_suite) + "\\qminstck.dll\n"));
 }
 
-TEST_F(LegacyRemovalTest, OldOutlookFilesAndTheFolderAbove327GoAtRestart) {
-    for (const wchar_t* row : {L"Mirovan\\327\\OI", L"Other\\3270\\OI"}) {
+// The old Outlook integration: without the console user's registration (the
+// line) the machine's parts go all the same; its files, found through its
+// class, at the next restart, with the folder above when that is named 327.
+TEST_F(LegacyRemovalTest, OldOutlookIntegrationGoes) {
+    RegMakeKey(kUser, Installer(kUser) + L"Products");
+    for (const std::wstring row : {L"Mirovan\\327\\OI", L"Other\\3270\\OI", L""}) {
+        SCOPED_TRACE(Narrow(row));  // empty: no class registered
         const std::wstring folder = m_scratch.Sub(row, true);
         for (const wchar_t* name : {L"OI3Main.dll", L"mirovanoi.chm", L"notes.txt"}) {
             WriteFileBytes(JoinPath(folder, name), "old");
         }
-        RegPutString(HKEY_CLASSES_ROOT, kOldServer + L"\\InprocServer32", L"",
-                     folder + L"\\OI3Main.dll");
+        RegRemoveTree(HKEY_CLASSES_ROOT, kOldServer);
+        if (!row.empty()) {
+            RegPutString(HKEY_CLASSES_ROOT, kOldServer + L"\\InprocServer32", L"",
+                         folder + L"\\OI3Main.dll");
+        }
+        Register(kMachine, kOutlookCode, 1);
+        RegMakeKey(kMachine, kCopies + kOutlookCode);
         const size_t before = PendingDeleteCount();
-        Program().Run(L"-uninstalloldoi");
-        EXPECT_TRUE(IsPendingDelete(folder + L"\\mirovanoi.chm") && IsPendingDelete(folder));
-        // A folder named 327 above it goes too; one named 3270 is another folder.
-        const std::wstring top = row;
-        const bool above = IsPendingDelete(m_scratch.Sub(top.substr(0, top.find(L'\\'))));
+        RunResult run = Program().Run(L"-uninstalloldoi");
+        EXPECT_TRUE(run.HasTrace(
+            " DelInstallerKeyByUpgrade: RegOpenKeyEx UpgradeID FAILED, Error = 2\n,\n"));
+        EXPECT_EQ(0, EntriesLeft(kMachine, 0));
+        EXPECT_FALSE(RegHasKey(kMachine, kCopies + kOutlookCode));
+        const bool above = IsPendingDelete(m_scratch.Sub(row.substr(0, row.find(L'\\'))));
         EXPECT_EQ(row[0] == L'M', above);
-        EXPECT_EQ(before + 3 + above, PendingDeleteCount()) << Narrow(row);
+        EXPECT_EQ(!row.empty(), IsPendingDelete(folder + L"\\mirovanoi.chm"));
+        EXPECT_EQ(before + (row.empty() ? 0 : 3 + above), PendingDeleteCount());
     }
 }
 
