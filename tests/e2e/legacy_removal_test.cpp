@@ -104,14 +104,6 @@ TEST_F(LegacyRemovalTest, ListedProductsGoThenTheUpgradeCode) {
     }
 }
 
-TEST_F(LegacyRemovalTest, InstallerCheckLibraryIsCalledFromTheSuiteFolder) {
-    Put(L"qminstck.dll", m_suite, L"qminstck.dll");
-    Program().Run(L"-modifyadminmsidisplayversion");
-    EXPECT_NE(std::string::npos,
-              ReadFileBytes(Program().callsLogPath())
-                  .find("ModifyAdminMsiVersion from " + Narrow(m_suite) + "\\qminstck.dll\n"));
-}
-
 // The old Outlook integration: without the console user's registration (the
 // line) the machine's parts go all the same; its files, found through its
 // class, at the next restart, with the folder above when that is named 327.

@@ -10,12 +10,10 @@
 #include <string>
 #include <vector>
 
-#include "cleanup/link_folder.h"
 #include "cleanup/shell_link.h"
 #include "tests/support/file_util.h"
 #include "tests/support/machine_fixture.h"
 #include "tests/support/registry_util.h"
-#include "tests/support/scratch_dir.h"
 #include "tests/support/test_paths.h"
 
 namespace {
@@ -282,7 +280,6 @@ const LanguageCase kLanguageCases[] = {
     {nullptr, L"XX", 1041, 1041},            // unknown: the product's language
     {nullptr, nullptr, 4105, 1033},          // "EN"
     {nullptr, nullptr, 2058, 3082},          // "SP"
-    {nullptr, nullptr, 1034, 2058},          // "ES"
     {nullptr, nullptr, std::nullopt, 1033},  // no suite at all
 };
 
@@ -308,24 +305,5 @@ TEST_P(UILanguageTest, ProgramStartsInTheChosenLanguage) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Cases, UILanguageTest, ::testing::ValuesIn(kLanguageCases));
-
-// A named move (a desktop's one shortcut, moved by updateshortcuts only as
-// the system account, which Wine cannot give) takes only that shortcut, in
-// any case, and never removes its folder, emptied or not.
-TEST(MoveLinkTargetIconTest, NamedMoveTakesOnlyThatShortcutAndKeepsTheFolder) {
-    for (const Names& others : {Names{L"B.lnk"}, Names{}}) {
-        ScratchDir scratch;
-        const std::wstring source = scratch.Sub(L"source", true);
-        const std::wstring destination = scratch.Sub(L"destination");
-        for (const std::wstring& name : others) {
-            WriteFileBytes(JoinPath(source, name), "other");
-        }
-        WriteFileBytes(JoinPath(source, L"A.lnk"), "moved");
-        MoveLinkTargetIcon(nullptr, source.c_str(), destination.c_str(), L"a");
-        EXPECT_EQ("moved", ReadFileBytes(JoinPath(destination, L"A.lnk")));
-        EXPECT_EQ(others, ListDir(source));
-        EXPECT_TRUE(DirExists(source));
-    }
-}
 
 }  // namespace
