@@ -24,33 +24,34 @@ protected:
             SetEvent(release);
             CloseHandle(release);
         }
-        Open(DELETE, [](SC_HANDLE service) { DeleteService(service); });
+        Delete();
         for (int i = 0; i < 100 && Installed(); ++i) {
             Sleep(100);
         }
         CloseServiceHandle(m_manager);
     }
-    template <typename Fn>
-    bool Open(DWORD access, Fn fn) {
-        SC_HANDLE service = OpenServiceW(m_manager, L"MirovanService", access);
-        if (service != nullptr) {
-            fn(service);
-            CloseServiceHandle(service);
-        }
+    bool Installed() {
+        SC_HANDLE service = OpenServiceW(m_manager, L"MirovanService", SERVICE_QUERY_STATUS);
+        CloseServiceHandle(service);
         return service != nullptr;
     }
-    bool Installed() {
-        return Open(SERVICE_QUERY_STATUS, [](SC_HANDLE) {});
+    // DeleteService's error, 0 for none.
+    DWORD Delete() {
+        SC_HANDLE service = OpenServiceW(m_manager, L"MirovanService", DELETE);
+        DWORD error = DeleteService(service) ? 0 : GetLastError();
+        CloseServiceHandle(service);
+        return error;
     }
     // Registers the stand-in and has the service manager start it.
     void Install(const wchar_t* polls, const wchar_t* waitHint = L"1000") {
         std::wstring command = L"\"" + FakePath(L"mirovan_service.exe") + L"\" \"" +
                                Program().callsLogPath() + L"\" " + waitHint + L" " + polls;
-        CloseServiceHandle(
+        SC_HANDLE service =
             CreateServiceW(m_manager, L"MirovanService", L"MirovanService", SERVICE_ALL_ACCESS,
                            SERVICE_WIN32_OWN_PROCESS, SERVICE_DEMAND_START, SERVICE_ERROR_IGNORE,
-                           command.c_str(), nullptr, nullptr, nullptr, nullptr, nullptr));
-        ASSERT_TRUE(Open(SERVICE_START, [](SC_HANDLE s) { StartServiceW(s, 0, nullptr); }));
+                           command.c_str(), nullptr, nullptr, nullptr, nullptr, nullptr);
+        ASSERT_TRUE(StartServiceW(service, 0, nullptr));
+        CloseServiceHandle(service);
         for (int i = 0; i < 100 && ReadFileBytes(Program().callsLogPath()).empty(); ++i) {
             Sleep(100);  // until it reports running
         }
@@ -89,7 +90,7 @@ TEST_F(UpdateServiceTest, ServiceIsDeletedOnceItHasStopped) {
 
 TEST_F(UpdateServiceTest, ServiceMarkedForDeletionCountsAsRemoved) {
     Install(L"1");
-    ASSERT_TRUE(Open(DELETE, [](SC_HANDLE service) { DeleteService(service); }));
+    ASSERT_EQ(0u, Delete());
     EXPECT_TRUE(SvcUninstall());
 }
 
@@ -101,9 +102,7 @@ TEST_F(UpdateServiceTest, ServiceThatNeverStopsIsMarkedForDeletionAfterAMinute) 
     EXPECT_GE(elapsedMs, 61000u);
     EXPECT_LT(elapsedMs, 80000u);
     // Marked: the manager deletes it as soon as it stops.
-    DWORD error = 0;
-    Open(DELETE, [&error](SC_HANDLE s) { error = DeleteService(s) ? 0 : GetLastError(); });
-    EXPECT_EQ(DWORD(ERROR_SERVICE_MARKED_FOR_DELETE), error);
+    EXPECT_EQ(DWORD(ERROR_SERVICE_MARKED_FOR_DELETE), Delete());
 }
 
 }  // namespace
