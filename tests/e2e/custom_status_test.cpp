@@ -1,6 +1,5 @@
-// mocvistainstall run by the real program: the Communicator and Lync policy
-// values it writes, the suite's status files, and the files an administrator
-// configured, friendly or hostile.
+// mocvistainstall end to end: the Communicator and Lync policy values, the
+// suite's status files, and configured files, friendly or hostile.
 #include <windows.h>
 #include <sddl.h>
 #include <gtest/gtest.h>
@@ -58,8 +57,7 @@ protected:
     const std::string m_template = ReadFileBytes(FakePath(L"MirovanStatus.xml"));
 };
 
-// Without a policy the template is installed and the policy pointed at it;
-// run again, the file is configured, holds the suite's state, and stays as it is.
+// Without a policy the template is installed and named; run again, it stays.
 TEST_F(CustomStatusTest, WithoutPolicyTheStatusFileIsInstalledOnce) {
     const struct {
         const char* name;
@@ -96,9 +94,8 @@ TEST_F(CustomStatusTest, WithoutPolicyTheStatusFileIsInstalledOnce) {
     }
 }
 
-// A configured file gains the suite's state once, or is refused and left as
-// it was (nothing it refers to is read: a loaded entity would be saved). The
-// size limit is the same reader's as platform.xml's, tested there.
+// A configured file gains the state once, or is refused and left as it was
+// (a loaded entity would be saved); the size limit is platform.xml's reader's.
 TEST_F(CustomStatusTest, ConfiguredFileGainsTheStateOnceOrIsLeftAlone) {
     const std::wstring secret = m_scratch.Sub(L"secret.txt");
     WriteFileBytes(secret, "SECRET");
@@ -125,8 +122,7 @@ TEST_F(CustomStatusTest, ConfiguredFileGainsTheStateOnceOrIsLeftAlone) {
     }
 }
 
-// Only a missing "Quillmark Tools" folder and its "Mirovan" folder are made,
-// and only for a file URL.
+// Only missing "Quillmark Tools" and "Mirovan" folders are made, for file URLs.
 TEST_F(CustomStatusTest, OnlyTheSuitesFoldersAreCreatedForAFileUrl) {
     const struct {
         const wchar_t* scheme;

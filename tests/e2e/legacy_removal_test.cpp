@@ -1,7 +1,5 @@
-// What older releases left behind: the old integrations' Windows Installer
-// registrations (by upgrade code), the old Outlook integration's files (at
-// the next restart), update leftovers, a retired COM registration, and the
-// 64-bit add-ins, unregistered for real by the 64-bit regsvr32.
+// What older releases left: Windows Installer registrations, the old Outlook
+// integration's files, update leftovers, a retired class and 64-bit add-ins.
 #include <windows.h>
 #include <gtest/gtest.h>
 
@@ -20,8 +18,7 @@ const std::wstring kNotesCode = L"UpgradeCodes\\39A1EB3B91C93B54EAD80FE3C665084C
 const std::wstring kOutlookCode = L"UpgradeCodes\\E4698B57199D4B241AF129150B2CCAE2";
 const std::wstring kCopies = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Installer\\";
 const std::wstring kUninstall = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\";
-// Packed and braced product codes (the installer's two examples first): two
-// listed under the upgrade code, one not.
+// Packed and braced product codes, the first two listed under the code.
 const std::wstring kProducts[][2] = {
     {L"39A1EB3B91C93B54EAD80FE3C665084C", L"{B3BE1A93-9C19-45B3-AE8D-F03E6C5680C4}"},
     {L"E4698B57199D4B241AF129150B2CCAE2", L"{75B8964E-D991-42B4-A11F-9251B0C2AC2E}"},
@@ -62,7 +59,6 @@ protected:
         RegRemoveValue(kMachine, kToolbar, kToolbarClass.c_str());
         RegRemoveValue(kMachine, kToolbar, L"QMTest-Neighbour");
     }
-    // The products' entries under root, the first two listed under the code.
     static void Register(HKEY root, const std::wstring& code, int products) {
         for (int product = 0; product < products; ++product) {
             for (int part = 0; part < 3; ++part) {
@@ -104,9 +100,8 @@ TEST_F(LegacyRemovalTest, ListedProductsGoThenTheUpgradeCode) {
     }
 }
 
-// The old Outlook integration: without the console user's registration (the
-// line) the machine's parts go all the same; its files, found through its
-// class, at the next restart, with the folder above when that is named 327.
+// Without the user's registration the machine's goes all the same; the
+// files at restart, with the folder above when named 327 (empty row: no class).
 TEST_F(LegacyRemovalTest, OldOutlookIntegrationGoes) {
     RegMakeKey(kUser, Installer(kUser) + L"Products");
     for (const std::wstring row : {L"Mirovan\\327\\OI", L"Other\\3270\\OI", L""}) {

@@ -1,7 +1,6 @@
-// "delunuseddata", registry half: the suite's key leaves every loadable
-// profile hive (real NTUSER.DAT files) and the caller's own HKEY_CURRENT_USER.
-// Wine does not write a hive back on unload, so each hive is looked at while
-// the program holds it: the program is stopped at each RegUnLoadKeyW.
+// "delunuseddata": the suite's key leaves every loadable profile hive and the
+// caller's HKCU. Wine does not write a hive back on unload, so the program is
+// stopped at each RegUnLoadKeyW and the hive looked at then.
 #include <windows.h>
 #include <gtest/gtest.h>
 #include <shlobj.h>
@@ -78,8 +77,7 @@ protected:
     std::wstring Profile(const wchar_t* user) const { return JoinPath(m_profiles, user); }
     std::wstring Hive(const wchar_t* user) const { return Profile(user) + L"\\NTUSER.DAT"; }
 
-    // Runs -delunuseddata; at each unload notes each loaded test hive's keys:
-    // 1 the suite's key, 2 the other key.
+    // At each unload, each loaded hive's keys: 1 the suite's, 2 the other.
     RunResult Run(HANDLE token = nullptr) {
         EntryStop stop(reinterpret_cast<const void*>(
                            GetProcAddress(GetModuleHandleW(L"advapi32.dll"), "RegUnLoadKeyW")),
@@ -104,8 +102,7 @@ TEST_F(ProfileHivesTest, EveryLoadableHiveLosesTheKeyAndIsUnloaded) {
     HeldOpen loggedOn(Hive(L"QMTest-InUse"), 0);
     ASSERT_TRUE(loggedOn.ok());
     RunResult run = Run();
-    // Cleaned while loaded, the other key kept, the planted link deleted as a
-    // link: its machine target stays. Both unloaded again.
+    // The other key kept, the planted link deleted as a link; all unloaded.
     EXPECT_EQ(2, m_seen[L"QMTest-A"]);
     EXPECT_EQ(2, m_seen[L"QMTest-B"]);
     EXPECT_TRUE(RegHasKey(HKEY_LOCAL_MACHINE, kTarget + L"\\Child", KEY_WOW64_64KEY));

@@ -1,6 +1,5 @@
-// The Notes plug-in's self-update run by the real program: the installed
-// program hands over to its temporary copy, which speaks with the stand-in
-// updater and configuration tool. SelfUpdateSlow runs as a test of its own.
+// The Notes plug-in's self-update: the installed program, its temporary copy
+// and the stand-in updater and tool. SelfUpdateSlow runs as its own test.
 #include <gtest/gtest.h>
 
 #include "notes/plugin_file_lists.h"
@@ -38,8 +37,7 @@ protected:
         ASSERT_TRUE(CopyFileW(FakePath(fake).c_str(), JoinPath(folder, name).c_str(), FALSE));
     }
 
-    // The temporary copy (its name compared in any case) beside the stand-in
-    // updater; the installed program is a stand-in that records its start.
+    // The copy (its name in another case); the installed program a stand-in.
     ProgramUnderTest& Copy() {
         if (!m_copy) {
             ProgramOptions options;
@@ -51,8 +49,7 @@ protected:
         return *m_copy;
     }
 
-    // Runs -nupdate with the updater's script and the configuration tool's
-    // exit code, waits for the programs it starts and reads what they logged.
+    // -nupdate with the stand-ins' scripts; waits for what it starts.
     RunResult Run(ProgramUnderTest& program, const wchar_t* updater, int configExit = 0,
                   int configDelayMs = 0, DWORD timeoutMs = 20000) {
         program.SetEnv(L"QM_FAKE_UPDATER", updater);

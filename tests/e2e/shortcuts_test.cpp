@@ -28,8 +28,7 @@ const wchar_t kSuiteFolder[] = L"Mirovan Meeting Center";  // string 3145
 const wchar_t kOneClickLink[] = L"Mirovan Meetings.lnk";
 const wchar_t kMsiexec[] = L"C:\\windows\\syswow64\\msiexec.exe";
 const wchar_t kNotepad[] = L"C:\\windows\\notepad.exe";
-// The uninstall entry of a product filed under one of the suite's upgrade
-// codes (by its packed code, in RegisterProduct).
+// The uninstall entry of the product RegisterProduct files (packed there).
 const std::wstring kUninstallEntry =
     L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\"
     L"{B3BE1A93-9C19-45B3-AE8D-F03E6C5680C4}";
@@ -49,8 +48,7 @@ void RegisterProduct(int code, REGSAM upgradeView, REGSAM entryView) {
     RegMakeKey(HKEY_LOCAL_MACHINE, kUninstallEntry, entryView);
 }
 
-// A shortcut as "name: target arguments | working folder | icon,index", in
-// lower case (the shell hands paths back in any case).
+// "name: target arguments | working folder | icon,index", in lower case.
 std::wstring Describe(std::wstring name, const std::wstring& target, const wchar_t* arguments,
                       const std::wstring& folder, const std::wstring& icon, int index) {
     std::wstring text = name + L": " + target + L" " + arguments + L" | " + folder + L" | " + icon +
@@ -61,8 +59,7 @@ std::wstring Describe(std::wstring name, const std::wstring& target, const wchar
 
 enum ShellFolder { kPrograms, kCommonPrograms, kDesktop, kCommonDesktop };
 
-// The suite installed in the program's folder; whatever a test adds to the
-// shell's folders is removed after it.
+// The suite in the program's folder; what a test adds to the shell's folders goes after it.
 class SuiteTest : public MachineTest {
 protected:
     SuiteTest() {
@@ -124,8 +121,7 @@ protected:
         return described;
     }
 
-    // The one-click, help, settings and uninstall shortcuts. Wine reports a
-    // shortcut without an icon as having its target's.
+    // The suite's shortcuts (Wine gives one without an icon its target's).
     Names SuiteLinks() const {
         const std::wstring oneClick = InRoot(L"qmoneclk.exe");
         const std::wstring setup = InRoot(L"qminst.exe");
@@ -153,8 +149,7 @@ protected:
     Names m_before[4];
 };
 
-// The Start-menu folder by how the companion application is registered, and
-// what lands in it when the texts are missing or 260 characters long.
+// The Start-menu folder by how the companion is registered, or with bad texts.
 struct AddCase {
     int code;  // the companion's upgrade code (its "DisplayName" set), -1 for none
     REGSAM view;
@@ -204,8 +199,7 @@ TEST_P(AddShortcutsTest, CreatesTheSuiteShortcutsInTheCompanionsFolder) {
 INSTANTIATE_TEST_SUITE_P(Folders, AddShortcutsTest, ::testing::ValuesIn(kAddCases));
 
 TEST_F(SuiteTest, UpdateRenamesAnOlderReleasesShortcutsAndMovesThemToTheSuiteFolder) {
-    // An older release's shortcuts, under old names and with old icons, in
-    // the folder named after the companion's product (there is no companion).
+    // An older release's shortcuts, old names and icons, in the default folder.
     const wchar_t* oldIcon = L"C:\\old\\icons.dll";
     for (int programs : {kPrograms, kCommonPrograms}) {
         const std::wstring folder = In(programs, kDefaultFolder);
@@ -236,8 +230,7 @@ TEST_F(SuiteTest, UpdateAddsShortcutsWhenNoDesktopShortcutWasRenamed) {
     EXPECT_EQ(SuiteLinks(), Shortcuts(kCommonPrograms, kDefaultFolder));
 }
 
-// The suite's shortcuts go (the uninstall shortcut whatever its arguments),
-// nothing else; a folder left empty goes.
+// The suite's shortcuts go (uninstall whatever its arguments), nothing else.
 class RemoveShortcutsTest : public SuiteTest,
                             public ::testing::WithParamInterface<const wchar_t*> {};
 
@@ -265,8 +258,7 @@ TEST_P(RemoveShortcutsTest, RemovesOnlyTheSuitesShortcuts) {
 INSTANTIATE_TEST_SUITE_P(Keywords, RemoveShortcutsTest,
                          ::testing::Values(L"-delshortcuts", L"-delunuseddata"));
 
-// The UI language, seen as the LANGID the program hands to
-// SetThreadUILanguage (Wine's changes nothing a test could observe).
+// The LANGID handed to SetThreadUILanguage (Wine's changes nothing visible).
 struct LanguageCase {
     const wchar_t* userCode;     // HKCU "QMUILanguage", or null
     const wchar_t* machineCode;  // HKLM (32-bit view) "QMUILanguage", or null

@@ -1,7 +1,5 @@
-// The update service's removal against the prefix's own service manager, with
-// a stand-in service that stops after a scripted number of polls or never.
-// Problems go to the event log, which Wine shows on its "eventlog" debug
-// channel: the program is run by the host's wine to read that channel.
+// The update service's removal, a stand-in service stopping after some polls
+// or never. Reports go to the event log, seen on Wine's "eventlog" channel.
 #include <windows.h>
 #include <gtest/gtest.h>
 
@@ -56,8 +54,7 @@ protected:
             Sleep(100);  // until it reports running
         }
     }
-    // -delallqmfiles on a machine without the suite: Wine's debug output,
-    // with the event-log reports; elapsedMs the time it took.
+    // -delallqmfiles run by the host's wine: its debug output; elapsedMs.
     std::string Run() {
         const std::wstring errors = m_scratch.Sub(L"stderr.txt");
         const DWORD start = GetTickCount();
@@ -94,8 +91,7 @@ TEST_F(UpdateServiceTest, ServiceMarkedForDeletionCountsAsRemoved) {
     EXPECT_TRUE(SvcUninstall());
 }
 
-// Waits out the 60 s limit: run on its own, labelled slow. The second wait
-// hint of 45 s is cut to what is left of the minute.
+// Waits out the 60 s limit (labelled slow); the 45 s hint is cut to fit.
 TEST_F(UpdateServiceTest, ServiceThatNeverStopsIsMarkedForDeletionAfterAMinute) {
     Install(L"never", L"45000");
     EXPECT_EQ(std::string::npos, Run().find("ReportEventW"));
