@@ -130,7 +130,6 @@ TEST_F(CustomStatusTest, OnlyTheSuitesFoldersAreCreatedForAFileUrl) {
         const wchar_t* folder;    // of the configured file
         bool created;
     } rows[] = {
-        {L"file://", L"a", L"a\\Mirovan\\Quillmark Tools", true},
         {L"file://", L"b\\Mirovan", L"b\\Mirovan\\Quillmark Tools", true},
         {L"file://", L"c\\Mirovan", L"c\\Mirovan\\Other", false},
         {L"file://", L"d", L"d\\Other\\Quillmark Tools", false},

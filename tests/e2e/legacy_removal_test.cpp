@@ -76,7 +76,6 @@ protected:
     void Put(const wchar_t* fake, const std::wstring& folder, const wchar_t* name) {
         CopyFileW(FakePath(fake).c_str(), JoinPath(folder, name).c_str(), FALSE);
     }
-
     const std::wstring m_suite = m_scratch.Sub(L"suite", true);
 };
 
@@ -140,12 +139,10 @@ TEST_F(LegacyRemovalTest, UpdateLeftoversRetiredClassesAndAddinsGo) {
     RegPutString(kMachine, kToolbar, kToolbarClass.c_str(), L"");
     RegPutString(kMachine, kToolbar, L"QMTest-Neighbour", L"");
     Put(L"addin64.dll", m_suite, L"qmMrvst64.dll");
-
     Program().Run(L"-deleteregfeaturecontrol");  // changes nothing at all
     EXPECT_TRUE(FileExists(updTemp + L"\\a_upd_temp"));
     EXPECT_TRUE(RegHasKey(kMachine, kToolbarKey));
     EXPECT_EQ(std::string::npos, ReadFileBytes(Program().callsLogPath()).find("Dll"));
-
     Program().Run(L"-delupdtemp");
     EXPECT_EQ(std::vector<std::wstring>{L"components"}, ListDir(updTemp));
     EXPECT_EQ(std::vector<std::wstring>{L"b.txt"}, ListDir(updTemp + L"\\components"));

@@ -73,10 +73,8 @@ protected:
         }
         RegRemoveTree(HKEY_LOCAL_MACHINE, kTarget, KEY_WOW64_64KEY);
     }
-
     std::wstring Profile(const wchar_t* user) const { return JoinPath(m_profiles, user); }
     std::wstring Hive(const wchar_t* user) const { return Profile(user) + L"\\NTUSER.DAT"; }
-
     // At each unload, each loaded hive's keys: 1 the suite's, 2 the other.
     RunResult Run(HANDLE token = nullptr) {
         EntryStop stop(reinterpret_cast<const void*>(
@@ -93,7 +91,6 @@ protected:
         EXPECT_EQ(0, run.exitCode);
         return run;
     }
-
     std::wstring m_profiles;
     std::map<std::wstring, int> m_seen;
 };

@@ -32,11 +32,9 @@ protected:
         RegPutString(HKEY_LOCAL_MACHINE, kNIKey, L"Path", m_scratch.Sub(L"NI"));
         Put(L"qmnwcfg.exe", m_plugin, L"qmnwcfg.exe");
     }
-
     static void Put(const wchar_t* fake, const std::wstring& folder, const wchar_t* name) {
         ASSERT_TRUE(CopyFileW(FakePath(fake).c_str(), JoinPath(folder, name).c_str(), FALSE));
     }
-
     // The copy (its name in another case); the installed program a stand-in.
     ProgramUnderTest& Copy() {
         if (!m_copy) {
@@ -48,7 +46,6 @@ protected:
         }
         return *m_copy;
     }
-
     // -nupdate with the stand-ins' scripts; waits for what it starts.
     RunResult Run(ProgramUnderTest& program, const wchar_t* updater, int configExit = 0,
                   int configDelayMs = 0, DWORD timeoutMs = 20000) {
@@ -62,7 +59,6 @@ protected:
         m_calls = ReadFileBytes(program.callsLogPath());
         return run;
     }
-
     std::wstring m_notes;
     std::wstring m_plugin;
     std::unique_ptr<ProgramUnderTest> m_copy;

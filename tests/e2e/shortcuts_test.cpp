@@ -95,7 +95,6 @@ protected:
     }
     std::wstring InRoot(const wchar_t* name) const { return JoinPath(m_root, name); }
     std::wstring In(int shell, const wchar_t* name) const { return JoinPath(m_shell[shell], name); }
-
     // What shell folder i holds that it did not hold before the test.
     Names Added(int i) const {
         Names added;
@@ -106,7 +105,6 @@ protected:
         }
         return added;
     }
-
     // The shortcuts added to shell folder i, or all in its subfolder, described.
     Names Shortcuts(int i, const wchar_t* subfolder = nullptr) const {
         const std::wstring folder = subfolder ? In(i, subfolder) : m_shell[i];
@@ -120,7 +118,6 @@ protected:
         }
         return described;
     }
-
     // The suite's shortcuts (Wine gives one without an icon its target's).
     Names SuiteLinks() const {
         const std::wstring oneClick = InRoot(L"qmoneclk.exe");
@@ -135,7 +132,6 @@ protected:
                      (std::wstring(L"/x ") + kProductCode).c_str(), m_root, kMsiexec, 0),
         };
     }
-
     void Plant(const std::wstring& folder, const wchar_t* name, const std::wstring& target,
                const wchar_t* arguments = nullptr, const wchar_t* icon = nullptr, int index = 0) {
         MakeDirs(folder);
@@ -143,7 +139,6 @@ protected:
                                             JoinPath(folder, name).c_str(), arguments, icon, index,
                                             m_root.c_str()));
     }
-
     const std::wstring m_root = Program().folder();
     std::wstring m_shell[4];
     Names m_before[4];
@@ -208,7 +203,6 @@ TEST_F(SuiteTest, UpdateRenamesAnOlderReleasesShortcutsAndMovesThemToTheSuiteFol
         Plant(folder, L"Guide.lnk", InRoot(L"qminst.exe"), L"/help", oldIcon, 7);
     }
     Plant(m_shell[kCommonDesktop], L"Join.lnk", InRoot(L"qmoneclk.exe"), nullptr, oldIcon, 5);
-
     Program().Run(L"-updateshortcuts");
     const Names links = SuiteLinks();
     const std::wstring guide =
@@ -245,7 +239,6 @@ TEST_P(RemoveShortcutsTest, RemovesOnlyTheSuitesShortcuts) {
     ASSERT_TRUE(WriteFileBytes(JoinPath(folder, L"Broken.lnk"), "not a shortcut"));
     Plant(In(kPrograms, L"Other Vendor"), kOneClickLink, InRoot(L"qmoneclk.exe"));
     Plant(m_shell[kDesktop], L"Join.lnk", InRoot(L"qmoneclk.exe"), L"/now");
-
     Program().Run(GetParam());
     EXPECT_EQ((Names{L"Broken.lnk", L"Gone.lnk", L"Log.lnk", L"Long.lnk", L"Notepad.lnk"}),
               ListDir(folder));

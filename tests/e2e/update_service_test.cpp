@@ -64,7 +64,6 @@ protected:
         elapsedMs = GetTickCount() - start;
         return ReadFileBytes(errors);
     }
-
     SC_HANDLE m_manager = OpenSCManagerW(nullptr, nullptr, SC_MANAGER_ALL_ACCESS);
     DWORD elapsedMs = 0;
 };
