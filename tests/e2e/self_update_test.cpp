@@ -25,26 +25,15 @@ int Count(const std::string& text, const std::string& part) {
 
 class SelfUpdate : public MachineTest {
 protected:
-    SelfUpdate()
-        : m_notes(m_scratch.Sub(L"Lotus\\Notes", true)),
-          m_plugin(m_scratch.Sub(L"NI\\Notes", true)) {
+    SelfUpdate() {
         RegPutString(HKEY_LOCAL_MACHINE, kNotes8Key, L"Path", m_notes);
         RegPutString(HKEY_LOCAL_MACHINE, kNIKey, L"Path", m_scratch.Sub(L"NI"));
         Put(L"qmnwcfg.exe", m_plugin, L"qmnwcfg.exe");
+        Put(L"qmniupd.exe", m_plugin, L"~TmpDown.exe");
+        Put(L"qmnwcfg.exe", m_notes, L"qmMrvONI.exe");  // the installed program, a stand-in
     }
     static void Put(const wchar_t* fake, const std::wstring& folder, const wchar_t* name) {
         ASSERT_TRUE(CopyFileW(FakePath(fake).c_str(), JoinPath(folder, name).c_str(), FALSE));
-    }
-    // The copy (its name in another case); the installed program a stand-in.
-    ProgramUnderTest& Copy() {
-        if (!m_copy) {
-            ProgramOptions options;
-            options.exeName = L"~MRVONI.EXE";
-            m_copy = std::make_unique<ProgramUnderTest>(m_plugin, options);
-            Put(L"qmniupd.exe", m_plugin, L"~TmpDown.exe");
-            Put(L"qmnwcfg.exe", m_notes, L"qmMrvONI.exe");
-        }
-        return *m_copy;
     }
     // -nupdate with the stand-ins' scripts; waits for what it starts.
     RunResult Run(ProgramUnderTest& program, const wchar_t* updater, int configExit = 0,
@@ -59,9 +48,10 @@ protected:
         m_calls = ReadFileBytes(program.callsLogPath());
         return run;
     }
-    std::wstring m_notes;
-    std::wstring m_plugin;
-    std::unique_ptr<ProgramUnderTest> m_copy;
+    const std::wstring m_notes = m_scratch.Sub(L"Lotus\\Notes", true);
+    const std::wstring m_plugin = m_scratch.Sub(L"NI\\Notes", true);
+    // The temporary copy, its name in another case.
+    ProgramUnderTest m_copy{m_plugin, {TraceLibrary::kBoth, true, L"~MRVONI.EXE"}};
     std::string m_calls;
 };
 
@@ -98,7 +88,6 @@ TEST_F(SelfUpdate, TemporaryCopyCommitsOrRollsBackAndHandsOverToTheInstalledProg
         if (c.siteName != nullptr) {
             RegPutString(HKEY_CURRENT_USER, kSiteKey, L"sitename", c.siteName);
         }
-        Copy();
         DeleteFileW(JoinPath(m_plugin, L"qmnwcfg.exe").c_str());
         DeleteFileW(JoinPath(m_plugin, L"~TmpDown.exe").c_str());
         if (c.configExit != kNoConfigTool) {
@@ -107,7 +96,7 @@ TEST_F(SelfUpdate, TemporaryCopyCommitsOrRollsBackAndHandsOverToTheInstalledProg
         if (c.updater != nullptr) {
             Put(L"qmniupd.exe", m_plugin, L"~TmpDown.exe");
         }
-        RunResult run = Run(Copy(), c.updater ? c.updater : L"", c.configExit, c.configDelayMs);
+        RunResult run = Run(m_copy, c.updater ? c.updater : L"", c.configExit, c.configDelayMs);
         EXPECT_EQ(c.exitCode, run.exitCode);
         // The updater's start: the window's handle, the site name, the Notes folder.
         EXPECT_EQ(c.updater ? 1 : 0,
@@ -146,7 +135,7 @@ class SelfUpdateSlow : public SelfUpdate {};
 
 TEST_F(SelfUpdateSlow, UpdaterThatNeverEndsIsTerminatedAfterThirtySeconds) {
     const DWORD start = GetTickCount();
-    EXPECT_EQ(0, Run(Copy(), L"ignore", 0, 0, 90000).exitCode);
+    EXPECT_EQ(0, Run(m_copy, L"ignore", 0, 0, 90000).exitCode);
     const DWORD elapsed = GetTickCount() - start;
     EXPECT_TRUE(AwaitProcessesNamed(L"~TmpDown.exe", 5000));
     EXPECT_GE(elapsed, 29000u);
