@@ -5,7 +5,6 @@
 
 #include <string>
 
-#include "cleanup/update_service.h"
 #include "tests/support/file_util.h"
 #include "tests/support/host_shell.h"
 #include "tests/support/machine_fixture.h"
@@ -82,12 +81,6 @@ TEST_F(UpdateServiceTest, ServiceIsDeletedOnceItHasStopped) {
     // Gone as the program ends: it waited three wait hints after its pause.
     EXPECT_FALSE(Installed());
     EXPECT_GE(elapsedMs, 4000u);
-}
-
-TEST_F(UpdateServiceTest, ServiceMarkedForDeletionCountsAsRemoved) {
-    Install(L"1");
-    ASSERT_EQ(0u, Delete());
-    EXPECT_TRUE(SvcUninstall());
 }
 
 // Waits out the 60 s limit (labelled slow); the 45 s hint is cut to fit.
