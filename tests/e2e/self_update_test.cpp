@@ -74,10 +74,8 @@ const struct ProtocolCase {
     {"updater gone, no window", L"post-exit bogus", 0, 300, nullptr, 0, 1, nullptr, "-nendupdate"},
     {"reported twice", L"post-wait twice", 0, 0, nullptr, 0, 1, "commit", "-nendupdate"},
     {"updater ends silently", L"no-post", 0, 0, nullptr, -1, 0, nullptr, "-nendupdatefail"},
-    {"success from outside", L"post-exit msg=1126", 0, 0, nullptr, 0, 0, nullptr,
-     "-nendupdatefail"},
-    {"failure from outside", L"post-exit msg=1127", 0, 0, nullptr, -1, 0, nullptr,
-     "-nendupdatefail"},
+    {"1126 from outside", L"post-exit msg=1126", 0, 0, nullptr, 0, 0, nullptr, "-nendupdatefail"},
+    {"1127 from outside", L"post-exit msg=1127", 0, 0, nullptr, -1, 0, nullptr, "-nendupdatefail"},
     {"no updater", nullptr, 0, 0, nullptr, 0, 0, nullptr, nullptr},
 };
 

@@ -156,7 +156,6 @@ struct AddCase {
 const AddCase kAddCases[] = {
     {-1, 0, nullptr, false, kDefaultFolder},
     {0, k64, nullptr, false, kSuiteFolder},
-    {0, 0, nullptr, false, kDefaultFolder},  // the first code is not looked up in 32 bits
     {3, 0, nullptr, false, kSuiteFolder},
     {-1, 0, L"Mirovan", false, kSuiteFolder},
     {-1, 0, nullptr, true, kDefaultFolder},
