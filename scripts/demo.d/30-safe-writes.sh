@@ -14,9 +14,11 @@ fi
 section "Maintenance command: per-user copy with a link planted in the Notes data folder"
 victim="$c/elsewhere"
 mkdir -p "$victim/applications/eclipse/plugins" "$victim/applications/eclipse/features"
+mv "$notes/Data/workspace" "$notes/Data/workspace.real"
 ln -s "$victim" "$notes/Data/workspace"
 echo "  Data\\workspace -> C:\\elsewhere"
 run -smsinstallsametimeex
 echo "  C:\\elsewhere now holds $(find "$victim" -type f | wc -l) files"
 rm "$notes/Data/workspace"
+mv "$notes/Data/workspace.real" "$notes/Data/workspace"
 rm -rf "$victim"

@@ -1,8 +1,7 @@
 # shellcheck shell=bash
-# Install of a later release: its resource libraries name the one-click and
-# settings shortcuts anew; the existing ones are renamed and get their icons.
+# Use: the suite's updater runs updateshortcuts. The shortcuts already carry
+# this release's names: none is renamed, so the missing ones are added.
 section "Maintenance command: update the shortcuts to the current release's names"
-cp "$build/bin/fakes/qmRes.dll" "$build/bin/fakes/qmOI3Res.dll" "$suite/"
 run -updateshortcuts
 echo "  shortcuts now:"
 shortcuts

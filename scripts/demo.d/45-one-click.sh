@@ -6,5 +6,5 @@ export QM_FAKE_CALLS_LOG='C:\demo-calls.log'
 run '<CmdLine><Action>JoinMeeting</Action><hWnd>0</hWnd></CmdLine>'
 echo "  the one-click library received (only the desktop lies under the mouse cursor here):"
 grep -v '^qmusredt' "$c/demo-calls.log" | tr -d '\r' | sed 's/^/    /'
-rm -f "$c/demo-calls.log"
+rm -f "$c/demo-calls.log" "$suite/qmMrvMS.DLL"
 unset QM_FAKE_CALLS_LOG

@@ -6,8 +6,8 @@ section "Action command: start a meeting through the Suite service"
 cp "$build/bin/fakes/qmSrv.exe" "$build/bin/fakes/qmsrv.tlb" "$suite/"
 wine "$suite/qmSrv.exe" -RegServer
 printf 'Event=StartOCMeeting Meeting 96 500 1\n' > "$suite/qmsrv-script.txt"
-export QM_FAKE_QMSRV_SCRIPT='C:\Program Files\Quillmark Tools\qmsrv-script.txt'
-export QM_FAKE_QMSRV_LOG='C:\Program Files\Quillmark Tools\qmsrv.log'
+export QM_FAKE_QMSRV_SCRIPT="$(winepath -w "$suite/qmsrv-script.txt")"
+export QM_FAKE_QMSRV_LOG="$(winepath -w "$suite/qmsrv.log")"
 run '<CmdLine><Action>StartOCMeeting</Action><Client>OI</Client><hWnd>1234</hWnd></CmdLine>'
 echo "  what the Suite service received and raised:"
 # The log holds "<kind> <name> <count>" lines, each followed by its arguments.
@@ -19,3 +19,4 @@ awk '/^(call|event) / { kind = $1; name = $2; count = $3; n = 0
     "$suite/qmsrv.log"
 wine "$suite/qmSrv.exe" -UnregServer
 unset QM_FAKE_QMSRV_SCRIPT QM_FAKE_QMSRV_LOG
+rm -f "$suite/qmSrv.exe" "$suite/qmsrv.tlb" "$suite/qmsrv-script.txt" "$suite/qmsrv.log"

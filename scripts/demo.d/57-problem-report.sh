@@ -23,4 +23,4 @@ echo "  the mail MAPI was given:"
 grep -v '^qmusredt' "$calls" | sed 's/^/    /'
 echo "  entries of Mirovan_Trace.zip:"
 unzip -l "$temp/Mirovan_Trace.zip" | sed 's/^/    /'
-rm -f "$calls" "$temp"/*.mvt "$temp/Mirovan_Trace.zip"
+rm -f "$calls" "$temp"/*.mvt "$temp/Mirovan_Trace.zip" "$suite/qmocres.dll" "$suite/MAPI32.DLL"

@@ -17,9 +17,9 @@ for f in lcppn30.dll ndbmrvqm.dll qmnires.dll NIURL.dll qmMRVURL.DLL qmnwintc.dl
 done
 cp "$build/bin/fakes/qmnwcfg.exe" "$build/bin/fakes/mrvtrace.dll" "$plugin/"
 cp "$build/bin/fakes/qmniupd.exe" "$notes/qmniupd.exe"
-reg 'HKLM\SOFTWARE\mirovan\NI' /v Path /d 'C:\Program Files\Quillmark Tools\NI'
+reg 'HKLM\SOFTWARE\mirovan\NI' /v Path /d 'C:\Program Files (x86)\Quillmark Tools\NI'
 reg 'HKCU\Software\Mirovan_Notes\General' /v sitename /d 'demo.mirovan.example'
-echo "  plug-in folder C:\\Program Files\\Quillmark Tools\\NI\\Notes holds the 28 downloaded files"
+echo "  plug-in folder C:\\Program Files (x86)\\Quillmark Tools\\NI\\Notes holds the 28 downloaded files"
 before=$(listing "$notes")
 
 export QM_FAKE_CALLS_LOG='C:\self-update-calls.log' QM_FAKE_UPDATER=post-wait QM_FAKE_CONFIG_EXIT=0
@@ -33,3 +33,7 @@ rm -f "$c/self-update-calls.log"
 echo "  temporary copies left in the plug-in folder: $(cd "$plugin" && ls -- '~'* 2>/dev/null || echo none)"
 echo "  added to the Notes folder from the plug-in folder:"
 comm -13 <(echo "$before") <(listing "$notes")
+# The downloaded plug-in folder and its settings were this step's own.
+rm -rf "$suite/NI"
+wine reg delete 'HKLM\SOFTWARE\mirovan\NI' /reg:32 /f >/dev/null
+wine reg delete 'HKCU\Software\Mirovan_Notes' /f >/dev/null

@@ -1,6 +1,8 @@
 # shellcheck shell=bash
 # Uninstall: the suite's leftovers, every user's settings and the update
-# service.
+# service. The two commands run here directly, so that the users' hives can be
+# shown while the program has them loaded; the package's uninstall runs them
+# again as its custom actions.
 section "Seeding: two more users with the suite's settings, the update service, 64-bit add-ins"
 # A user's NTUSER.DAT, written in Wine's own hive format.
 user_hive() {
@@ -56,3 +58,5 @@ if wine reg query 'HKCU\SOFTWARE\Mirovan\QmkTools' >/dev/null 2>&1; then
 else
   echo "  this account's SOFTWARE\\Mirovan\\QmkTools: gone"
 fi
+# The 64-bit add-ins were this step's own (the package does not carry them).
+rm -f "$suite/qmolkadd64.dll" "$suite/qmMrvst64.dll"

@@ -9,6 +9,8 @@
 // With QM_DEMO_WATCH_HIVES set to user names (";" between them), it also shows
 // what those users' hives hold under SOFTWARE\Mirovan as the program unloads
 // them (Wine does not write a hive back to its file).
+//   demo_runner.exe --trace <trace log>
+// prints the records of runs started by others (an installer's custom actions).
 #include <windows.h>
 
 #include <algorithm>
@@ -36,6 +38,14 @@ void PrintRecordText(const std::string& text) {
         }
     }
     printf("%s", shown.c_str());
+}
+
+void PrintRecords(const std::wstring& traceLog) {
+    for (const TraceRecord& record : ReadTraceLog(traceLog)) {
+        printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
+        PrintRecordText(record.text);
+        printf("\n");
+    }
 }
 
 // The names listed in an environment variable (";" between them).
@@ -86,6 +96,10 @@ void PrintLoadedHives(const std::vector<std::wstring>& users) {
 }  // namespace
 
 int wmain(int argc, wchar_t** argv) {
+    if (argc == 3 && std::wstring(argv[1]) == L"--trace") {
+        PrintRecords(argv[2]);
+        return 0;
+    }
     if (argc < 3) {
         fprintf(stderr, "usage: demo_runner <program folder> <arguments>...\n");
         return 2;
@@ -111,11 +125,7 @@ int wmain(int argc, wchar_t** argv) {
         SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", traceLog.c_str());  // for the program
         RunResult run = RunDebuggee(L"\"" + program + L"\" " + arguments, folder, 120000, hooks);
         AwaitStartedPrograms();
-        for (const TraceRecord& record : ReadTraceLog(traceLog)) {
-            printf("  trace [level %lu] ", static_cast<unsigned long>(record.level));
-            PrintRecordText(record.text);
-            printf("\n");
-        }
+        PrintRecords(traceLog);
         std::vector<CopyData> messages = caller.Received();
         for (size_t m = received; m < messages.size(); ++m) {
             printf("  WM_COPYDATA to the caller: %s\n", Narrow(messages[m].text).c_str());
