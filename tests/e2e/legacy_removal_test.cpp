@@ -1,6 +1,5 @@
-// What older releases left behind: the old Outlook integration's files (at the
-// next restart), update leftovers, retired COM registrations, and the 64-bit
-// add-ins, unregistered for real by the 64-bit regsvr32.
+// What older releases left: Windows Installer registrations, the old Outlook
+// integration's files, update leftovers, a retired class and 64-bit add-ins.
 #include <windows.h>
 #include <gtest/gtest.h>
 
@@ -13,59 +12,112 @@
 
 namespace {
 
+const HKEY kUser = HKEY_CURRENT_USER;
 const HKEY kMachine = HKEY_LOCAL_MACHINE;
+const std::wstring kNotesCode = L"UpgradeCodes\\39A1EB3B91C93B54EAD80FE3C665084C";
+const std::wstring kOutlookCode = L"UpgradeCodes\\E4698B57199D4B241AF129150B2CCAE2";
+const std::wstring kCopies = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Installer\\";
+const std::wstring kUninstall = L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\";
+// Packed and braced product codes, the first two listed under the code.
+const std::wstring kProducts[][2] = {
+    {L"39A1EB3B91C93B54EAD80FE3C665084C", L"{B3BE1A93-9C19-45B3-AE8D-F03E6C5680C4}"},
+    {L"E4698B57199D4B241AF129150B2CCAE2", L"{75B8964E-D991-42B4-A11F-9251B0C2AC2E}"},
+    {L"AAAAAAAABBBBCCCCDDDDEEEEEEEEEEEE", L"{AAAAAAAA-BBBB-CCCC-DDDD-EEEEEEEEEEEE}"}};
 const std::wstring kOldServer = L"CLSID\\{061E7FF2-9750-46FB-AFD6-245CE0AB8549}";
 const std::wstring kToolbarClass = L"{90E2BA2E-DD1B-4cde-9134-7A8B86D33CA7}";
 const std::wstring kToolbar = L"SOFTWARE\\Microsoft\\Internet Explorer\\Toolbar";
-const std::wstring kRetired[] = {
-    L"SOFTWARE\\Classes\\CLSID\\" + kToolbarClass,
-    L"SOFTWARE\\Classes\\QmOneCli.MrvIEToolbar.1",
-    L"SOFTWARE\\Classes\\QmOneCli.MrvIEToolbar",
-    L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Explorer\\Browser Helper Objects\\" +
-        kToolbarClass,
-    L"SOFTWARE\\Classes\\CLSID\\{0A4C50AC-AD3F-4245-B324-3C8696A3408A}",
-    L"SOFTWARE\\Classes\\QmMrvst.MrvAction.1",
-    L"SOFTWARE\\Classes\\QmMrvst.MrvAction",
-};
+const std::wstring kToolbarKey = L"SOFTWARE\\Classes\\CLSID\\" + kToolbarClass;
+
+std::wstring Installer(HKEY root) {
+    return root == kUser ? L"SOFTWARE\\Microsoft\\Installer\\" : L"SOFTWARE\\Classes\\Installer\\";
+}
+
+// A product's "Products" (part 0) or "Features" (1) key, or its uninstall entry (2).
+std::wstring Entry(HKEY root, int product, int part) {
+    const wchar_t* lists[] = {L"Products\\", L"Features\\"};
+    return part < 2 ? Installer(root) + lists[part] + kProducts[product][0]
+                    : kUninstall + kProducts[product][1];
+}
 
 class LegacyRemovalTest : public MachineTest {
 protected:
-    LegacyRemovalTest() : m_suite(m_scratch.Sub(L"suite", true)) {
+    LegacyRemovalTest() {
         RegPutString(kMachine, L"SOFTWARE\\Mirovan\\QmkTools", L"Path", m_suite);
     }
     ~LegacyRemovalTest() override {
-        RegRemoveTree(HKEY_CLASSES_ROOT, kOldServer);
-        for (const std::wstring& key : kRetired) {
-            RegRemoveTree(kMachine, key);
+        for (HKEY root : {kUser, kMachine}) {
+            for (int entry = 0; entry < 9; ++entry) {
+                RegRemoveTree(root, Entry(root, entry / 3, entry % 3));
+            }
+            for (const std::wstring& code : {kNotesCode, kOutlookCode}) {
+                RegRemoveTree(root, Installer(root) + code);
+                RegRemoveTree(kMachine, kCopies + code);
+            }
         }
+        RegRemoveTree(HKEY_CLASSES_ROOT, kOldServer);
+        RegRemoveTree(kMachine, kToolbarKey);
         RegRemoveValue(kMachine, kToolbar, kToolbarClass.c_str());
         RegRemoveValue(kMachine, kToolbar, L"QMTest-Neighbour");
     }
-    void AddAddin(const wchar_t* name) {
-        CopyFileW(FakePath(L"addin64.dll").c_str(), JoinPath(m_suite, name).c_str(), FALSE);
+    static void Register(HKEY root, const std::wstring& code, int products) {
+        for (int product = 0; product < products; ++product) {
+            for (int part = 0; part < 3; ++part) {
+                RegPutString(root, Entry(root, product, part) + L"\\Sub", L"v", L"x");
+            }
+            if (product < 2) {
+                RegPutString(root, Installer(root) + code, kProducts[product][0].c_str(), L"");
+            }
+        }
     }
-
-    const std::wstring m_suite;
+    static int EntriesLeft(HKEY root, int product) {
+        return RegHasKey(root, Entry(root, product, 0)) + RegHasKey(root, Entry(root, product, 1)) +
+               RegHasKey(root, Entry(root, product, 2));
+    }
+    const std::wstring m_suite = m_scratch.Sub(L"suite", true);
 };
 
-TEST_F(LegacyRemovalTest, OldOutlookFilesAndTheFolderAbove327GoAtRestart) {
-    for (const wchar_t* row : {L"Mirovan\\327\\OI", L"Other\\3270\\OI"}) {
+TEST_F(LegacyRemovalTest, ListedProductsGoThenTheUpgradeCode) {
+    for (HKEY root : {kUser, kMachine}) {
+        Register(root, kNotesCode, 3);
+    }
+    RegMakeKey(kMachine, kCopies + kNotesCode + L"\\Sub");
+    Program().Run(L"-uninstalloldni");
+    for (HKEY root : {kUser, kMachine}) {
+        SCOPED_TRACE(root == kUser ? "user" : "machine");
+        EXPECT_EQ(0, EntriesLeft(root, 0) + EntriesLeft(root, 1));
+        EXPECT_EQ(3, EntriesLeft(root, 2));
+        EXPECT_FALSE(RegHasKey(root, Installer(root) + kNotesCode));
+    }
+    EXPECT_FALSE(RegHasKey(kMachine, kCopies + kNotesCode));
+}
+
+// Without the user's registration the machine's goes all the same; the
+// files at restart, with the folder above when named 327 (empty row: no class).
+TEST_F(LegacyRemovalTest, OldOutlookIntegrationGoes) {
+    RegMakeKey(kUser, Installer(kUser) + L"Products");
+    for (const std::wstring row : {L"Mirovan\\327\\OI", L"Other\\3270\\OI", L""}) {
+        SCOPED_TRACE(Narrow(row));  // empty: no class registered
         const std::wstring folder = m_scratch.Sub(row, true);
         for (const wchar_t* name : {L"OI3Main.dll", L"mirovanoi.chm", L"notes.txt"}) {
             WriteFileBytes(JoinPath(folder, name), "old");
         }
-        RegPutString(HKEY_CLASSES_ROOT, kOldServer + L"\\InprocServer32", L"",
-                     folder + L"\\OI3Main.dll");
+        RegRemoveTree(HKEY_CLASSES_ROOT, kOldServer);
+        if (!row.empty()) {
+            RegPutString(HKEY_CLASSES_ROOT, kOldServer + L"\\InprocServer32", L"",
+                         folder + L"\\OI3Main.dll");
+        }
+        Register(kMachine, kOutlookCode, 1);
+        RegMakeKey(kMachine, kCopies + kOutlookCode);
         const size_t before = PendingDeleteCount();
-        Program().Run(L"-uninstalloldoi");
-        EXPECT_TRUE(IsPendingDelete(folder + L"\\OI3Main.dll"));
-        EXPECT_TRUE(IsPendingDelete(folder + L"\\mirovanoi.chm"));
-        EXPECT_TRUE(IsPendingDelete(folder));
-        // A folder named 327 above it goes too; one named 3270 is another folder.
-        const std::wstring top = row;
-        const bool above = IsPendingDelete(m_scratch.Sub(top.substr(0, top.find(L'\\'))));
+        RunResult run = Program().Run(L"-uninstalloldoi");
+        EXPECT_TRUE(run.HasTrace(
+            " DelInstallerKeyByUpgrade: RegOpenKeyEx UpgradeID FAILED, Error = 2\n,\n"));
+        EXPECT_EQ(0, EntriesLeft(kMachine, 0));
+        EXPECT_FALSE(RegHasKey(kMachine, kCopies + kOutlookCode));
+        const bool above = IsPendingDelete(m_scratch.Sub(row.substr(0, row.find(L'\\'))));
         EXPECT_EQ(row[0] == L'M', above);
-        EXPECT_EQ(before + 3 + above, PendingDeleteCount()) << Narrow(row);
+        EXPECT_EQ(!row.empty(), IsPendingDelete(folder + L"\\mirovanoi.chm"));
+        EXPECT_EQ(before + (row.empty() ? 0 : 3 + above), PendingDeleteCount());
     }
 }
 
@@ -75,56 +127,28 @@ TEST_F(LegacyRemovalTest, UpdateLeftoversRetiredClassesAndAddinsGo) {
                                 L"chrome\\c_upd_temp", L"..\\x_upd_temp.dat"}) {
         WriteFileBytes(JoinPath(updTemp, file), "left over");
     }
-    for (const std::wstring& key : kRetired) {
-        RegPutString(kMachine, key + L"\\InprocServer32", L"", L"x");
-    }
+    RegPutString(kMachine, kToolbarKey + L"\\InprocServer32", L"", L"x");
     RegPutString(kMachine, kToolbar, kToolbarClass.c_str(), L"");
     RegPutString(kMachine, kToolbar, L"QMTest-Neighbour", L"");
-    AddAddin(L"qmolkadd64.dll");
-    AddAddin(L"qmMrvst64.dll");
-
-    // This one changes nothing at all.
-    Program().Run(L"-deleteregfeaturecontrol");
+    CopyFileW(FakePath(L"addin64.dll").c_str(), (m_suite + L"\\qmMrvst64.dll").c_str(), FALSE);
+    Program().Run(L"-deleteregfeaturecontrol");  // changes nothing at all
     EXPECT_TRUE(FileExists(updTemp + L"\\a_upd_temp"));
-    EXPECT_TRUE(RegHasKey(kMachine, kRetired[0]));
+    EXPECT_TRUE(RegHasKey(kMachine, kToolbarKey));
     EXPECT_EQ(std::string::npos, ReadFileBytes(Program().callsLogPath()).find("Dll"));
-
-    RunResult run = Program().Run(L"-delupdtemp");
+    Program().Run(L"-delupdtemp");
     EXPECT_EQ(std::vector<std::wstring>{L"components"}, ListDir(updTemp));
     EXPECT_EQ(std::vector<std::wstring>{L"b.txt"}, ListDir(updTemp + L"\\components"));
     EXPECT_FALSE(FileExists(m_suite + L"\\x_upd_temp.dat"));
-    for (const std::wstring& key : kRetired) {
-        EXPECT_FALSE(RegHasKey(kMachine, key)) << Narrow(key);
-    }
+    EXPECT_FALSE(RegHasKey(kMachine, kToolbarKey));
     EXPECT_FALSE(RegHasValue(kMachine, kToolbar, kToolbarClass.c_str()));
     EXPECT_TRUE(RegHasValue(kMachine, kToolbar, L"QMTest-Neighbour"));
-    // Each add-in there through the 64-bit regsvr32, working in its folder.
+    // The add-in there through the 64-bit regsvr32, working in its folder.
     const std::string calls = ReadFileBytes(Program().callsLogPath());
-    for (const wchar_t* addin : {L"qmolkadd64.dll", L"qmMrvst64.dll"}) {
-        const std::string path = Narrow(JoinPath(m_suite, addin));
-        EXPECT_NE(std::string::npos,
-                  calls.find(path + " DllUnregisterServer in " + Narrow(m_suite) +
-                             " by C:\\windows\\system32\\regsvr32.exe /s /u \"" + path + "\""))
-            << calls;
-    }
-    EXPECT_TRUE(run.HasTrace(" RegQM64BitAddin: [" + Narrow(m_suite) +
-                             "\\qmMrvMS64.dll] is not existed!\n,\n"));
-}
-
-TEST_F(LegacyRemovalTest, Regsvr32ThatCannotStartIsLoggedAndNoErrorBoxWaits) {
-    wchar_t system[MAX_PATH] = {};
-    ASSERT_NE(0u, GetSystemWow64DirectoryW(system, MAX_PATH));
-    const std::wstring regsvr32 = JoinPath(system, L"regsvr32.exe");
-    const std::wstring saved = regsvr32 + L".qmsaved";
-    AddAddin(L"qmolkadd64.dll");
-    // Renamed, not rewritten: the prefix shares that file with its template.
-    ASSERT_TRUE(MoveFileW(regsvr32.c_str(), saved.c_str()));
-    WriteFileBytes(regsvr32, "not a program");
-    RunResult run = Program().Run(L"-delupdtemp", 30000);
-    DeleteFileW(regsvr32.c_str());
-    MoveFileW(saved.c_str(), regsvr32.c_str());
-    EXPECT_FALSE(run.timedOut);
-    EXPECT_TRUE(run.HasTraceContaining("Reg64BitDLL: ShellExecuteEx failed, error="));
+    const std::string path = Narrow(JoinPath(m_suite, L"qmMrvst64.dll"));
+    EXPECT_NE(std::string::npos,
+              calls.find(path + " DllUnregisterServer in " + Narrow(m_suite) +
+                         " by C:\\windows\\system32\\regsvr32.exe /s /u \"" + path + "\""))
+        << calls;
 }
 
 }  // namespace

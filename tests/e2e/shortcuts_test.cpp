@@ -1,112 +1,137 @@
-// The shortcut keywords end to end, the shortcuts read back through the shell
-// link object: where addshortcuts puts them and what they point at, how
-// updateshortcuts renames an older release's shortcuts and which job follows,
-// and what delshortcuts and delunuseddata remove and leave.
+// The suite's shortcuts and the UI language the program starts in, end to
+// end. The shortcuts are read back through the shell link object.
 #include <windows.h>
 #include <objbase.h>
 #include <shlobj.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <optional>
 #include <string>
 #include <vector>
 
 #include "cleanup/shell_link.h"
-#include "tests/e2e/suite_install.h"
-#include "tests/support/host_link.h"
+#include "tests/support/file_util.h"
 #include "tests/support/machine_fixture.h"
+#include "tests/support/registry_util.h"
+#include "tests/support/test_paths.h"
 
 namespace {
 
-using namespace suite_install;
 using Names = std::vector<std::wstring>;
 
 const REGSAM k64 = KEY_WOW64_64KEY;
+const wchar_t kSuiteKey[] = L"SOFTWARE\\Mirovan\\QmkTools";
 const wchar_t kProductCode[] = L"{6F1B2C3D-4E5F-4A6B-8C7D-9E0F1A2B3C4D}";
 const wchar_t kDefaultFolder[] = L"Mirovan Meetings";
 const wchar_t kSuiteFolder[] = L"Mirovan Meeting Center";  // string 3145
 const wchar_t kOneClickLink[] = L"Mirovan Meetings.lnk";
-const wchar_t kSettingsLink[] = L"Quillmark Tools Settings.lnk";
-const wchar_t kUninstallLink[] = L"Uninstall Quillmark Tools.lnk";
 const wchar_t kMsiexec[] = L"C:\\windows\\syswow64\\msiexec.exe";
 const wchar_t kNotepad[] = L"C:\\windows\\notepad.exe";
+// The uninstall entry of the product RegisterProduct files (packed there).
+const std::wstring kUninstallEntry =
+    L"SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\"
+    L"{B3BE1A93-9C19-45B3-AE8D-F03E6C5680C4}";
 
-std::wstring ShellFolder(int csidl) {
-    wchar_t path[MAX_PATH] = {};
-    SHGetFolderPathW(nullptr, csidl, nullptr, SHGFP_TYPE_DEFAULT, path);
-    return path;
+std::wstring UpgradeKey(int code) {
+    const wchar_t* const codes[] = {
+        L"D246995CF3A71534DA5CB21A176B54E1", L"1A705790D0FBFFE4DBC7B0F099009CD9",
+        L"01B86E973310E6B41B32D3838B0D7F54", L"B65785237423439438E10A099BA54F48"};
+    return std::wstring(
+               L"Software\\Microsoft\\Windows\\CurrentVersion\\Installer\\UpgradeCodes\\") +
+           codes[code];
 }
 
-struct ExpectedLink {
-    const wchar_t* name;
-    std::wstring target;
-    std::wstring arguments;
-    std::wstring iconPath;
-    int iconIndex;
-};
+void RegisterProduct(int code, REGSAM upgradeView, REGSAM entryView) {
+    RegPutString(HKEY_LOCAL_MACHINE, UpgradeKey(code), L"39A1EB3B91C93B54EAD80FE3C665084C", L"",
+                 upgradeView);
+    RegMakeKey(HKEY_LOCAL_MACHINE, kUninstallEntry, entryView);
+}
 
-class ShortcutsTest : public MachineTest {
+// "name: target arguments | working folder | icon,index", in lower case.
+std::wstring Describe(std::wstring name, const std::wstring& target, const wchar_t* arguments,
+                      const std::wstring& folder, const std::wstring& icon, int index) {
+    std::wstring text = name + L": " + target + L" " + arguments + L" | " + folder + L" | " + icon +
+                        L"," + std::to_wstring(index);
+    CharLowerW(&text[0]);
+    return text;
+}
+
+enum ShellFolder { kPrograms, kCommonPrograms, kDesktop, kCommonDesktop };
+
+// The suite in the program's folder; what a test adds to the shell's folders goes after it.
+class SuiteTest : public MachineTest {
 protected:
-    ShortcutsTest() : m_root(Program().folder()) {
+    SuiteTest() {
         CoInitialize(nullptr);
-        InstallSuite(m_root, kProductCode);
+        const int csidls[] = {CSIDL_PROGRAMS, CSIDL_COMMON_PROGRAMS, CSIDL_DESKTOP,
+                              CSIDL_COMMON_DESKTOPDIRECTORY};
+        for (int i = 0; i < 4; ++i) {
+            wchar_t path[MAX_PATH] = {};
+            SHGetFolderPathW(nullptr, csidls[i], nullptr, SHGFP_TYPE_DEFAULT, path);
+            m_shell[i] = path;
+            m_before[i] = ListDir(path);
+        }
+        for (const wchar_t* file :
+             {L"qmoneclk.exe", L"qminst.exe", L"qmRes.dll", L"qmOI3Res.dll"}) {
+            CopyFileW(FakePath(file).c_str(), InRoot(file).c_str(), FALSE);
+        }
+        RegPutString(HKEY_LOCAL_MACHINE, kSuiteKey, L"Path", m_root);
+        RegPutString(HKEY_LOCAL_MACHINE, kSuiteKey, L"ProductCode", kProductCode);
     }
-    ~ShortcutsTest() override {
-        for (const std::wstring& programs : m_programs) {
-            for (const wchar_t* folder : {kDefaultFolder, kSuiteFolder, L"Other Vendor"}) {
-                RemoveTree(JoinPath(programs, folder));
+    ~SuiteTest() override {
+        for (int i = 0; i < 4; ++i) {
+            for (const std::wstring& name : Added(i)) {
+                RemoveTree(JoinPath(m_shell[i], name));
             }
         }
-        for (const std::wstring& desktop : {m_userDesktop, m_commonDesktop}) {
-            for (const std::wstring& name : ListDir(desktop)) {
-                RemoveTree(JoinPath(desktop, name));
+        for (REGSAM view : {REGSAM(0), k64}) {
+            for (int code = 0; code < 4; ++code) {
+                RegRemoveTree(HKEY_LOCAL_MACHINE, UpgradeKey(code), view);
             }
+            RegRemoveTree(HKEY_LOCAL_MACHINE, kUninstallEntry, view);
         }
-        RemoveProducts();
         CoUninitialize();
     }
-    void SetUp() override {
-        // The prefix's own desktop folder, never the host's home behind a link.
-        ASSERT_EQ(0u, GetFileAttributesW(m_userDesktop.c_str()) & FILE_ATTRIBUTE_REPARSE_POINT);
-    }
-
     std::wstring InRoot(const wchar_t* name) const { return JoinPath(m_root, name); }
-
-    std::vector<ExpectedLink> SuiteLinks() const {
-        std::wstring oneClick = InRoot(L"qmoneclk.exe");
+    std::wstring In(int shell, const wchar_t* name) const { return JoinPath(m_shell[shell], name); }
+    // What shell folder i holds that it did not hold before the test.
+    Names Added(int i) const {
+        Names added;
+        for (const std::wstring& name : ListDir(m_shell[i])) {
+            if (std::find(m_before[i].begin(), m_before[i].end(), name) == m_before[i].end()) {
+                added.push_back(name);
+            }
+        }
+        return added;
+    }
+    // The shortcuts added to shell folder i, or all in its subfolder, described.
+    Names Shortcuts(int i, const wchar_t* subfolder = nullptr) const {
+        const std::wstring folder = subfolder ? In(i, subfolder) : m_shell[i];
+        Names described;
+        for (const std::wstring& name : subfolder ? ListDir(folder) : Added(i)) {
+            LinkFields link;
+            EXPECT_HRESULT_SUCCEEDED(ReadLink(nullptr, JoinPath(folder, name).c_str(), link));
+            described.push_back(Describe(name, link.target.c_str(), link.arguments.c_str(),
+                                         link.workingDir.c_str(), link.iconPath.c_str(),
+                                         link.iconIndex));
+        }
+        return described;
+    }
+    // The suite's shortcuts (Wine gives one without an icon its target's).
+    Names SuiteLinks() const {
+        const std::wstring oneClick = InRoot(L"qmoneclk.exe");
+        const std::wstring setup = InRoot(L"qminst.exe");
+        const std::wstring icons = InRoot(L"qmRes.dll");
         return {
-            {kOneClickLink, oneClick, L"", oneClick, 0},
-            {kSettingsLink, InRoot(L"qminst.exe"), L"/OpenSetting=1", InRoot(L"qmRes.dll"), 3},
-            {L"Quillmark Tools Help.lnk", InRoot(L"qminst.exe"), L"/help for quillmark tools",
-             InRoot(L"qmRes.dll"), 2},
-            {kUninstallLink, kMsiexec, std::wstring(L"/x ") + kProductCode, L"", 0},
+            Describe(kOneClickLink, oneClick, L"", m_root, oneClick, 0),
+            Describe(L"Quillmark Tools Help.lnk", setup, L"/help for quillmark tools", m_root,
+                     icons, 2),
+            Describe(L"Quillmark Tools Settings.lnk", setup, L"/OpenSetting=1", m_root, icons, 3),
+            Describe(L"Uninstall Quillmark Tools.lnk", kMsiexec,
+                     (std::wstring(L"/x ") + kProductCode).c_str(), m_root, kMsiexec, 0),
         };
     }
-
-    void ExpectLink(const std::wstring& folder, const ExpectedLink& expected) {
-        std::wstring path = JoinPath(folder, expected.name);
-        SCOPED_TRACE(Narrow(path));
-        LinkFields link;
-        ASSERT_HRESULT_SUCCEEDED(ReadLink(nullptr, path.c_str(), link));
-        EXPECT_STRCASEEQ(Narrow(expected.target).c_str(), Narrow(link.target.c_str()).c_str());
-        EXPECT_STREQ(expected.arguments.c_str(), link.arguments.c_str());
-        EXPECT_STRCASEEQ(Narrow(m_root).c_str(), Narrow(link.workingDir.c_str()).c_str());
-        // Wine reports a shortcut without an icon as having its target's.
-        const std::wstring& icon = expected.iconPath.empty() ? expected.target : expected.iconPath;
-        EXPECT_STRCASEEQ(Narrow(icon).c_str(), Narrow(link.iconPath.c_str()).c_str());
-        EXPECT_EQ(expected.iconIndex, link.iconIndex);
-    }
-
-    void ExpectSuiteFolder(const std::wstring& folder) {
-        Names names;
-        for (const ExpectedLink& link : SuiteLinks()) {
-            names.push_back(link.name);
-            ExpectLink(folder, link);
-        }
-        std::sort(names.begin(), names.end());
-        EXPECT_EQ(names, ListDir(folder));
-    }
-
     void Plant(const std::wstring& folder, const wchar_t* name, const std::wstring& target,
                const wchar_t* arguments = nullptr, const wchar_t* icon = nullptr, int index = 0) {
         MakeDirs(folder);
@@ -114,213 +139,155 @@ protected:
                                             JoinPath(folder, name).c_str(), arguments, icon, index,
                                             m_root.c_str()));
     }
-
-    RunResult RunKeyword(const wchar_t* keyword) {
-        RunResult run = Program().Run(std::wstring(L"-") + keyword);
-        EXPECT_FALSE(run.crashed || run.timedOut) << Narrow(keyword);
-        EXPECT_EQ(0, run.exitCode);
-        return run;
-    }
-
-    std::wstring m_root;
-    const std::wstring m_programs[2] = {ShellFolder(CSIDL_PROGRAMS),
-                                        ShellFolder(CSIDL_COMMON_PROGRAMS)};
-    const std::wstring m_userDesktop = ShellFolder(CSIDL_DESKTOP);
-    const std::wstring m_commonDesktop = ShellFolder(CSIDL_COMMON_DESKTOPDIRECTORY);
+    const std::wstring m_root = Program().folder();
+    std::wstring m_shell[4];
+    Names m_before[4];
 };
 
-// The Start-menu folder, by how the companion application is registered.
-struct FolderCase {
-    int code;  // its upgrade code, -1 for none
+// The Start-menu folder by how the companion is registered, or with bad texts.
+struct AddCase {
+    int code;  // the companion's upgrade code (its "DisplayName" set), -1 for none
     REGSAM view;
-    const wchar_t* displayName;  // null: a number instead of a name
-    const wchar_t* appName;      // the suite's "AppName", or null
-    const wchar_t* expectedFolder;
+    const wchar_t* appName;  // the suite's "AppName", or null
+    bool badTexts;           // then only the uninstall shortcut has a usable name
+    const wchar_t* folder;   // null: none made
 };
 
-const FolderCase kFolderCases[] = {
-    {-1, 0, nullptr, nullptr, kDefaultFolder},    // none
-    {0, k64, L"Mirovan", nullptr, kSuiteFolder},  // the first code, 64-bit view
-    {0, 0, L"Mirovan", nullptr, kDefaultFolder},  // the first code is not looked up in 32 bits
-    {3, 0, L"Mirovan", nullptr, kSuiteFolder},    // the last code, 32-bit view
-    {-1, 0, nullptr, L"Mirovan", kSuiteFolder},   // "AppName" only
-    {1, k64, nullptr, nullptr, kDefaultFolder},   // a "DisplayName" that is no text
+const AddCase kAddCases[] = {
+    {-1, 0, nullptr, false, kDefaultFolder},
+    {0, k64, nullptr, false, kSuiteFolder},
+    {3, 0, nullptr, false, kSuiteFolder},
+    {-1, 0, L"Mirovan", false, kSuiteFolder},
+    {-1, 0, nullptr, true, kDefaultFolder},
+    {0, k64, nullptr, true, nullptr},  // string 3145 missing
 };
 
-class AddShortcutsTest : public ShortcutsTest, public ::testing::WithParamInterface<FolderCase> {};
+class AddShortcutsTest : public SuiteTest, public ::testing::WithParamInterface<AddCase> {};
 
 TEST_P(AddShortcutsTest, CreatesTheSuiteShortcutsInTheCompanionsFolder) {
-    const FolderCase& c = GetParam();
+    const AddCase& c = GetParam();
+    for (const wchar_t* library : {L"qmRes.dll", L"qmOI3Res.dll"}) {
+        const std::wstring release = c.badTexts ? L"badtexts\\" : L"";
+        CopyFileW(FakePath((release + library).c_str()).c_str(), InRoot(library).c_str(), FALSE);
+    }
     if (c.code >= 0) {
         RegisterProduct(c.code, c.view, c.view);
-        if (c.displayName != nullptr) {
-            RegPutString(HKEY_LOCAL_MACHINE, kUninstallEntry, L"DisplayName", c.displayName,
-                         c.view);
-        } else {
-            RegPutDword(HKEY_LOCAL_MACHINE, kUninstallEntry, L"DisplayName", 1, c.view);
-        }
+        RegPutString(HKEY_LOCAL_MACHINE, kUninstallEntry, L"DisplayName", L"Mirovan", c.view);
     }
     if (c.appName != nullptr) {
         RegPutString(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Mirovan\\Uninstall", L"AppName", c.appName);
     }
-    RunResult run = RunKeyword(L"addshortcuts");
-    EXPECT_TRUE(run.HasTrace(" qmmirovanoni.exe: Call addshortcutslinks.\n,\n"));
-    const wchar_t* other = c.expectedFolder == kSuiteFolder ? kDefaultFolder : kSuiteFolder;
-    for (const std::wstring& programs : m_programs) {
-        ExpectSuiteFolder(JoinPath(programs, c.expectedFolder));
-        EXPECT_FALSE(DirExists(JoinPath(programs, other)));
+    Program().Run(L"-addshortcuts");
+    const Names links = SuiteLinks();
+    for (int programs : {kPrograms, kCommonPrograms}) {
+        EXPECT_EQ(c.folder ? Names{c.folder} : Names{}, Added(programs));
+        if (c.folder != nullptr) {
+            EXPECT_EQ(c.badTexts ? Names{links[3]} : links, Shortcuts(programs, c.folder));
+        }
     }
     // The one-click shortcut on the common desktop, and so not on the user's.
-    EXPECT_EQ(Names{kOneClickLink}, ListDir(m_commonDesktop));
-    ExpectLink(m_commonDesktop, SuiteLinks()[0]);
-    EXPECT_TRUE(ListDir(m_userDesktop).empty());
+    EXPECT_EQ(c.badTexts ? Names{} : Names{links[0]}, Shortcuts(kCommonDesktop));
+    EXPECT_EQ(Names{}, Added(kDesktop));
 }
 
-INSTANTIATE_TEST_SUITE_P(Folders, AddShortcutsTest, ::testing::ValuesIn(kFolderCases));
+INSTANTIATE_TEST_SUITE_P(Folders, AddShortcutsTest, ::testing::ValuesIn(kAddCases));
 
-// Texts that cannot name a file (missing, or 260 characters long) and a
-// product code that is no text: what cannot be named is left out, and
-// nothing lands in the program folders themselves.
-struct BrokenCase {
-    bool companion;  // the folder is then named by the missing string 3145
-    bool productCodeIsText;
-    Names inDefaultFolder;
-};
-
-const BrokenCase kBrokenCases[] = {
-    {false, true, {kUninstallLink}},
-    {true, true, {}},
-    {false, false, {}},
-};
-
-class BrokenInputTest : public ShortcutsTest, public ::testing::WithParamInterface<BrokenCase> {};
-
-TEST_P(BrokenInputTest, CreatesOnlyWhatItCanName) {
-    const BrokenCase& c = GetParam();
-    UseTexts(m_root, c.productCodeIsText ? L"badtexts\\" : L"");
-    if (c.companion) {
-        RegisterProduct(0, k64, k64);
-        RegPutString(HKEY_LOCAL_MACHINE, kUninstallEntry, L"DisplayName", L"Mirovan", k64);
-    }
-    if (!c.productCodeIsText) {
-        RegPutDword(HKEY_LOCAL_MACHINE, kSuiteKey, L"ProductCode", 1);
-    }
-    const Names before[] = {ListDir(m_programs[0]), ListDir(m_programs[1])};
-    RunKeyword(L"addshortcuts");
-    for (int i = 0; i < 2; ++i) {
-        EXPECT_EQ(c.inDefaultFolder, ListDir(JoinPath(m_programs[i], kDefaultFolder)));
-        Names after = ListDir(m_programs[i]);
-        after.erase(std::remove(after.begin(), after.end(), kDefaultFolder), after.end());
-        EXPECT_EQ(before[i], after);
-    }
-    EXPECT_TRUE(ListDir(m_commonDesktop).empty());
-    EXPECT_TRUE(ListDir(m_userDesktop).empty());
-}
-
-INSTANTIATE_TEST_SUITE_P(Inputs, BrokenInputTest, ::testing::ValuesIn(kBrokenCases));
-
-TEST_F(ShortcutsTest, UpdateRenamesAnOlderReleasesShortcutsAndMovesThemToTheSuiteFolder) {
-    // An older release's shortcuts, under old names and with old icons, in
-    // the folder named after the companion's product (there is no companion).
+TEST_F(SuiteTest, UpdateRenamesAnOlderReleasesShortcutsAndMovesThemToTheSuiteFolder) {
+    // An older release's shortcuts, old names and icons, in the default folder.
     const wchar_t* oldIcon = L"C:\\old\\icons.dll";
-    const ExpectedLink help = {L"Guide.lnk", InRoot(L"qminst.exe"), L"/help for quillmark tools",
-                               oldIcon, 7};
-    for (const std::wstring& programs : m_programs) {
-        std::wstring folder = JoinPath(programs, kDefaultFolder);
+    for (int programs : {kPrograms, kCommonPrograms}) {
+        const std::wstring folder = In(programs, kDefaultFolder);
         Plant(folder, L"Join.lnk", InRoot(L"qmoneclk.exe"), nullptr, oldIcon, 5);
         Plant(folder, L"Options.lnk", InRoot(L"qminst.exe"), L"/OpenSetting=1", oldIcon, 6);
-        Plant(folder, help.name, help.target, help.arguments.c_str(), oldIcon, 7);
+        Plant(folder, L"Guide.lnk", InRoot(L"qminst.exe"), L"/help", oldIcon, 7);
     }
-    Plant(m_commonDesktop, L"Join.lnk", InRoot(L"qmoneclk.exe"), nullptr, oldIcon, 5);
-
-    RunResult run = RunKeyword(L"updateshortcuts");
-    EXPECT_TRUE(run.HasTrace(" qmmirovanoni.exe: Call udpateshortlinks.\n,\n"));
-    for (const std::wstring& programs : m_programs) {
-        std::wstring oldFolder = JoinPath(programs, kDefaultFolder);
-        std::wstring newFolder = JoinPath(programs, kSuiteFolder);
-        EXPECT_FALSE(DirExists(oldFolder));
-        EXPECT_EQ((Names{L"Guide.lnk", kOneClickLink, kSettingsLink}), ListDir(newFolder));
-        ExpectLink(newFolder, SuiteLinks()[0]);
-        ExpectLink(newFolder, SuiteLinks()[1]);
-        ExpectLink(newFolder, help);
-        EXPECT_TRUE(run.HasTrace("MoveLinkTargetIcon lpszLinkSrcDir=" + Narrow(oldFolder) +
-                                 ",lpszLinkDesDir=" + Narrow(newFolder) + ",lpszIconName=,\n"));
+    Plant(m_shell[kCommonDesktop], L"Join.lnk", InRoot(L"qmoneclk.exe"), nullptr, oldIcon, 5);
+    Program().Run(L"-updateshortcuts");
+    const Names links = SuiteLinks();
+    const std::wstring guide =
+        Describe(L"Guide.lnk", InRoot(L"qminst.exe"), L"/help", m_root, oldIcon, 7);
+    for (int programs : {kPrograms, kCommonPrograms}) {
+        EXPECT_EQ(Names{kSuiteFolder}, Added(programs));
+        EXPECT_EQ((Names{guide, links[0], links[2]}), Shortcuts(programs, kSuiteFolder));
     }
-    EXPECT_EQ(Names{kOneClickLink}, ListDir(m_commonDesktop));
-    ExpectLink(m_commonDesktop, SuiteLinks()[0]);
     // A desktop shortcut was renamed: the shortcuts are moved, not added.
-    EXPECT_TRUE(ListDir(m_userDesktop).empty());
+    EXPECT_EQ(Names{links[0]}, Shortcuts(kCommonDesktop));
+    EXPECT_EQ(Names{}, Added(kDesktop));
 }
 
-// The job after the renames: shortcuts are added only when both desktops
-// hold shortcuts and none was renamed (parameter: the user's desktop holds
-// one); else they are moved.
-class UpdateFollowUpTest : public ShortcutsTest, public ::testing::WithParamInterface<bool> {};
-
-TEST_P(UpdateFollowUpTest, AddsShortcutsOnlyWhenNoDesktopShortcutWasRenamed) {
-    Plant(m_commonDesktop, kOneClickLink, InRoot(L"qmoneclk.exe"));
-    if (GetParam()) {
-        Plant(m_userDesktop, L"Notepad.lnk", kNotepad);
-    }
-    RunKeyword(L"updateshortcuts");
-    for (const std::wstring& programs : m_programs) {
-        EXPECT_EQ(GetParam(), DirExists(JoinPath(programs, kDefaultFolder)));
-    }
-    EXPECT_EQ(Names{kOneClickLink}, ListDir(m_commonDesktop));
+// With both desktops holding shortcuts and none renamed, shortcuts are added.
+TEST_F(SuiteTest, UpdateAddsShortcutsWhenNoDesktopShortcutWasRenamed) {
+    Plant(m_shell[kCommonDesktop], kOneClickLink, InRoot(L"qmoneclk.exe"));
+    Plant(m_shell[kDesktop], L"Notepad.lnk", kNotepad);
+    Program().Run(L"-updateshortcuts");
+    EXPECT_EQ(SuiteLinks(), Shortcuts(kCommonPrograms, kDefaultFolder));
 }
 
-INSTANTIATE_TEST_SUITE_P(Desktops, UpdateFollowUpTest, ::testing::Bool());
-
-// The suite's shortcuts go (the uninstall shortcut whatever its arguments,
-// the one-click shortcut on the desktops), nothing else: not a qminst.exe
-// shortcut with other arguments, another program's shortcut, files that are
-// no shortcuts or whose targets are missing or too long, nor a shortcut in
-// another vendor's folder. A folder left empty goes.
-class RemoveShortcutsTest : public ShortcutsTest,
+// The suite's shortcuts go (uninstall whatever its arguments), nothing else.
+class RemoveShortcutsTest : public SuiteTest,
                             public ::testing::WithParamInterface<const wchar_t*> {};
 
 TEST_P(RemoveShortcutsTest, RemovesOnlyTheSuitesShortcuts) {
-    RunKeyword(L"addshortcuts");
-    std::wstring folder = JoinPath(m_programs[0], kDefaultFolder);
+    Program().Run(L"-addshortcuts");
+    const std::wstring folder = In(kPrograms, kDefaultFolder);
     Plant(folder, L"Repair.lnk", kMsiexec, L"/fa {00000000-0000-0000-0000-000000000000}");
     Plant(folder, L"Log.lnk", InRoot(L"qminst.exe"), L"/log");
     Plant(folder, L"Notepad.lnk", kNotepad);
     Plant(folder, L"Gone.lnk", InRoot(L"gone.exe"));
     Plant(folder, L"Long.lnk", m_root + L"\\" + std::wstring(280, L'x') + L".exe");
     ASSERT_TRUE(WriteFileBytes(JoinPath(folder, L"Broken.lnk"), "not a shortcut"));
-    std::wstring otherVendor = JoinPath(m_programs[0], L"Other Vendor");
-    Plant(otherVendor, kOneClickLink, InRoot(L"qmoneclk.exe"));
-    Plant(m_commonDesktop, L"Notepad.lnk", kNotepad);
-    // Written in short form, as Windows reads every shortcut's target.
-    wchar_t shortTarget[MAX_PATH] = {};
-    ASSERT_NE(0u, GetShortPathNameW(InRoot(L"qmoneclk.exe").c_str(), shortTarget, MAX_PATH));
-    ASSERT_NE(InRoot(L"qmoneclk.exe"), shortTarget);
-    Plant(m_userDesktop, L"Join.lnk", shortTarget, L"/now");
-
-    RunKeyword(GetParam());
+    Plant(In(kPrograms, L"Other Vendor"), kOneClickLink, InRoot(L"qmoneclk.exe"));
+    Plant(m_shell[kDesktop], L"Join.lnk", InRoot(L"qmoneclk.exe"), L"/now");
+    Program().Run(GetParam());
     EXPECT_EQ((Names{L"Broken.lnk", L"Gone.lnk", L"Log.lnk", L"Long.lnk", L"Notepad.lnk"}),
               ListDir(folder));
-    EXPECT_FALSE(DirExists(JoinPath(m_programs[1], kDefaultFolder)));
-    EXPECT_EQ(Names{kOneClickLink}, ListDir(otherVendor));
-    EXPECT_EQ(Names{L"Notepad.lnk"}, ListDir(m_commonDesktop));
-    EXPECT_TRUE(ListDir(m_userDesktop).empty());
+    EXPECT_EQ((Names{kDefaultFolder, L"Other Vendor"}), Added(kPrograms));
+    EXPECT_EQ(Names{}, Added(kCommonPrograms));
+    EXPECT_EQ(Names{}, Added(kCommonDesktop));
+    EXPECT_EQ(Names{}, Added(kDesktop));
 }
 
 INSTANTIATE_TEST_SUITE_P(Keywords, RemoveShortcutsTest,
-                         ::testing::Values(L"delshortcuts", L"delunuseddata"));
+                         ::testing::Values(L"-delshortcuts", L"-delunuseddata"));
 
-// A suite folder that the user replaced by a link: no shortcut is written
-// through it, and none it leads to is renamed or deleted.
-TEST_F(ShortcutsTest, NoShortcutWorkGoesThroughAPlantedLink) {
-    std::wstring elsewhere = m_scratch.Sub(L"elsewhere", true);
-    Plant(elsewhere, L"Join.lnk", InRoot(L"qmoneclk.exe"));
-    HostLink planted(JoinPath(m_programs[0], kDefaultFolder), elsewhere);
-    ASSERT_TRUE(planted.ok());
-    for (const wchar_t* keyword : {L"addshortcuts", L"updateshortcuts", L"delshortcuts"}) {
-        RunResult run = RunKeyword(keyword);
-        EXPECT_TRUE(run.HasTraceContaining("refused to go through a reparse point"));
-        EXPECT_EQ(Names{L"Join.lnk"}, ListDir(elsewhere)) << Narrow(keyword);
+// The LANGID handed to SetThreadUILanguage (Wine's changes nothing visible).
+struct LanguageCase {
+    const wchar_t* userCode;     // HKCU "QMUILanguage", or null
+    const wchar_t* machineCode;  // HKLM (32-bit view) "QMUILanguage", or null
+    std::optional<DWORD> productLanguage;
+    int expected;
+};
+
+const LanguageCase kLanguageCases[] = {
+    {L" jp ", nullptr, std::nullopt, 1041},  // trimmed, any case
+    {L"XX", L"JP", std::nullopt, 1033},      // unknown: the machine's is not read
+    {nullptr, L"XX", 1041, 1041},            // unknown: the product's language
+    {nullptr, nullptr, 4105, 1033},          // "EN"
+    {nullptr, nullptr, 2058, 3082},          // "SP"
+    {nullptr, nullptr, std::nullopt, 1033},  // no suite at all
+};
+
+class UILanguageTest : public SuiteTest, public ::testing::WithParamInterface<LanguageCase> {};
+
+TEST_P(UILanguageTest, ProgramStartsInTheChosenLanguage) {
+    const LanguageCase& c = GetParam();
+    RegRemoveTree(HKEY_LOCAL_MACHINE, kSuiteKey);
+    if (c.userCode != nullptr) {
+        RegPutString(HKEY_CURRENT_USER, kSuiteKey, L"QMUILanguage", c.userCode);
     }
+    if (c.machineCode != nullptr) {
+        RegPutString(HKEY_LOCAL_MACHINE, kSuiteKey, L"QMUILanguage", c.machineCode);
+    }
+    // Filed under a later upgrade code: the earlier ones are tried first.
+    if (c.productLanguage) {
+        RegisterProduct(2, k64, 0);
+        RegPutDword(HKEY_LOCAL_MACHINE, kUninstallEntry, L"Language", *c.productLanguage);
+    }
+    RunResult run = Program().Run(L"-x");
+    EXPECT_TRUE(run.HasDebugOutput("qmMrvONI.exe: _tWinMain: SetThreadUILanguage " +
+                                   std::to_string(c.expected) + "\n"));
 }
+
+INSTANTIATE_TEST_SUITE_P(Cases, UILanguageTest, ::testing::ValuesIn(kLanguageCases));
 
 }  // namespace

@@ -1,5 +1,4 @@
-// Waiting for programs that the program under test starts and does not wait
-// for itself.
+// Waiting for programs that the program under test starts and leaves running.
 #pragma once
 
 #include <windows.h>
