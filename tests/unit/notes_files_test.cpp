@@ -89,18 +89,6 @@ TEST_F(NotesFilesTest, FailedCopiesNeverLoseTheOriginal) {
     EXPECT_EQ(std::vector<std::wstring>{L"qmnires.dll.2025.1.1.0.0.0.bak"}, ListDir(m_folder));
 }
 
-TEST_F(NotesFilesTest, FileUnderTheBackupNameIsNeverReplaced) {
-    // Not even an earlier backup slated for deletion: had the original to
-    // stay under that name, the restart would delete it.
-    ScriptedPlatform platform;
-    WriteFileBytes(m_backup, "someone else's");
-    ASSERT_TRUE(MoveFileExW(m_backup.c_str(), nullptr, MOVEFILE_DELAY_UNTIL_REBOOT));
-    EXPECT_FALSE(CopyOverLoadedTarget(platform));
-    EXPECT_EQ("old content", ReadFileBytes(m_target));
-    EXPECT_EQ("someone else's", ReadFileBytes(m_backup));
-    EXPECT_EQ(2u, ListDir(m_folder).size());
-}
-
 TEST_F(NotesFilesTest, OldInstallFolderWithAForeignFileStays) {
     for (const wchar_t* name : kOldPluginFiles) {
         WriteFileBytes(JoinPath(m_folder, name), "old");
