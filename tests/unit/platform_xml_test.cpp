@@ -4,6 +4,8 @@
 #include <windows.h>
 #include <gtest/gtest.h>
 
+#include <filesystem>
+
 #include "base/untrusted_xml_bytes.h"
 #include "tests/support/file_util.h"
 #include "tests/support/scratch_dir.h"
@@ -33,14 +35,7 @@ TEST(UntrustedXmlBytes, AFileAboveTheSizeLimitIsNotRead) {
     ScratchDir scratch(L"pxml");
     const std::wstring file = scratch.Sub(L"platform.xml");
     ASSERT_TRUE(WriteFileBytes(file, "<config/>"));
-    HANDLE handle = CreateFileW(file.c_str(), GENERIC_WRITE, 0, nullptr, OPEN_EXISTING,
-                                FILE_ATTRIBUTE_NORMAL, nullptr);
-    ASSERT_NE(INVALID_HANDLE_VALUE, handle);
-    LARGE_INTEGER size;
-    size.QuadPart = static_cast<LONGLONG>(kMaxUntrustedXmlBytes) + 1;
-    SetFilePointerEx(handle, size, nullptr, FILE_BEGIN);
-    SetEndOfFile(handle);  // extended sparsely: only its size matters
-    CloseHandle(handle);
+    std::filesystem::resize_file(file, kMaxUntrustedXmlBytes + 1);  // only its size matters
     SAFEARRAY* bytes = nullptr;
     EXPECT_EQ(UntrustedXmlRead::kTooLarge, ReadUntrustedXml(file.c_str(), &bytes));
     EXPECT_EQ(nullptr, bytes);

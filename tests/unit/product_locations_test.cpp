@@ -1,6 +1,6 @@
 // The product lookups against real registry keys: values that do not fit the
-// caller's buffer count as absent (and leave it empty), the Notes key order and
-// version rules, the plug-in folder, and the Sametime search with its budget.
+// caller's buffer count as absent (and leave it empty), the Notes version
+// rules, the plug-in folder, and the Sametime search with its budget.
 
 #include <algorithm>
 
@@ -14,8 +14,6 @@ namespace {
 const HKEY kMachine = HKEY_LOCAL_MACHINE;
 const wchar_t kSuiteKey[] = L"SOFTWARE\\Mirovan\\QmkTools";
 const wchar_t kNotes[] = L"SOFTWARE\\Lotus\\Notes";
-const std::wstring kNotes6 = std::wstring(kNotes) + L"\\6.0";
-const std::wstring kNotes7 = std::wstring(kNotes) + L"\\7.0";
 const std::wstring kNotes8 = std::wstring(kNotes) + L"\\8.0";
 
 // A path-like text of exactly `chars` characters.
@@ -79,19 +77,6 @@ TEST_F(LocationsTest, ValueMustFitTheBufferWithItsTerminator) {
             EXPECT_EQ(value, large.text);
         }
     }
-}
-
-TEST_F(LocationsTest, NotesPathTriesTheKeysInOrderAndSkipsUnfitValues) {
-    ASSERT_TRUE(RegPutString(kMachine, kNotes, L"Path", L"C:\\Notes9"));
-    ASSERT_TRUE(RegPutString(kMachine, kNotes8, L"Path", L"C:\\Notes8"));
-    ASSERT_TRUE(RegMakeKey(kMachine, kNotes6));                                // no Path
-    ASSERT_TRUE(RegPutString(kMachine, kNotes7, L"Path", PathOfLength(300)));  // too large
-    Buffer buffer;
-    EXPECT_TRUE(GetNotesPath(buffer.text, buffer.capacity));
-    EXPECT_STREQ(L"C:\\Notes8", buffer.text);
-    ASSERT_TRUE(RegPutString(kMachine, kNotes7, L"Path", L"C:\\Notes7"));
-    EXPECT_TRUE(GetNotesPath(buffer.text, buffer.capacity));
-    EXPECT_STREQ(L"C:\\Notes7", buffer.text);
 }
 
 TEST_F(LocationsTest, NotesVersionRules) {

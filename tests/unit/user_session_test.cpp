@@ -5,10 +5,10 @@
 
 #include "base/os_version.h"
 #include "base/user_profile.h"
-#include "base/win_handles.h"
-#include "tests/unit/scratch_key.h"
 
 namespace {
+
+const HKEY kLoadedRoot = reinterpret_cast<HKEY>(0x4321);  // a stand-in nobody opens or closes
 
 bool IsOpenHandle(HANDLE handle) {
     DWORD flags = 0;
@@ -53,7 +53,7 @@ public:
     }
 };
 
-TEST(UserProfile, EveryFailedStepFallsBackToTheOwnHiveAndClosesTheToken) {
+TEST(UserProfile, ConsoleUsersProfileOrOnAnyFailedStepTheOwnHive) {
     const struct {
         const char* name;
         void (*arrange)(FakePlatform&);
@@ -73,37 +73,24 @@ TEST(UserProfile, EveryFailedStepFallsBackToTheOwnHiveAndClosesTheToken) {
         // Without the console session lookup (2000) the shell is sought.
         {"2000", [](FakePlatform& p) { p.osClass = kOSWin2000; },
          "interactive functions find4294967295 load "},
+        // The console user's loaded profile is the root until the end.
+        {"profile loaded", [](FakePlatform& p) { p.profileRoot = kLoadedRoot; },
+         "interactive functions console find1 load unload "},
     };
     for (const auto& c : cases) {
         FakePlatform platform;
         c.arrange(platform);
+        const HKEY expected = platform.profileRoot ? platform.profileRoot : HKEY_CURRENT_USER;
         {
             CUserProfile profile(platform);
-            EXPECT_EQ(HKEY_CURRENT_USER, profile.GetUserRegRoot()) << c.name;
-            EXPECT_EQ(HKEY_CURRENT_USER, profile.GetUserRegRoot()) << c.name;  // asked once
+            EXPECT_EQ(expected, profile.GetUserRegRoot()) << c.name;
+            EXPECT_EQ(expected, profile.GetUserRegRoot()) << c.name;  // asked once
         }
         EXPECT_EQ(c.calls, platform.calls) << c.name;
-        EXPECT_FALSE(IsOpenHandle(platform.token)) << c.name;
+        EXPECT_EQ(platform.profileRoot, platform.unloadedRoot) << c.name;
+        EXPECT_EQ(platform.profileRoot != nullptr, platform.tokenOpenAtUnload) << c.name;
+        EXPECT_FALSE(IsOpenHandle(platform.token)) << c.name;  // closed after the unload
     }
-}
-
-TEST(UserProfile, TheConsoleUsersLoadedProfileBecomesTheRootAndIsUnloadedAtTheEnd) {
-    ScratchKey hive(HKEY_CURRENT_USER, L"Software");
-    UniqueHKey root;
-    ASSERT_EQ(ERROR_SUCCESS,
-              RegOpenKeyExW(HKEY_CURRENT_USER, hive.path().c_str(), 0, KEY_ALL_ACCESS, root.put()));
-    FakePlatform platform;
-    platform.consoleSession = 3;
-    platform.profileRoot = root.get();
-    {
-        CUserProfile profile(platform);
-        EXPECT_EQ(root.get(), profile.GetUserRegRoot());
-        EXPECT_EQ(platform.token, profile.GetCurrentLogonUserToken());
-    }
-    EXPECT_EQ("interactive functions console find3 load unload ", platform.calls);
-    EXPECT_EQ(root.get(), platform.unloadedRoot);
-    EXPECT_TRUE(platform.tokenOpenAtUnload);
-    EXPECT_FALSE(IsOpenHandle(platform.token));  // closed after the unload
 }
 
 }  // namespace
