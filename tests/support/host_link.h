@@ -1,8 +1,7 @@
 // A host symbolic link planted in the test's Wine prefix: Windows calls under
 // Wine cannot make a junction or symbolic link, but a host link to a folder
 // shows to Windows programs as a directory reparse point, and writes through
-// it reach its target. Made and removed with the host's ln and rm, which
-// Wine starts by their Z:\ path.
+// it reach its target. Made and removed with the host's ln and rm.
 #pragma once
 
 #include <string>

@@ -131,12 +131,9 @@ ProgramUnderTest::ProgramUnderTest(const std::wstring& folder, const ProgramOpti
     : m_folder(folder), m_exePath(JoinPath(folder, options.exeName)) {
     MakeDirs(m_folder);
     CopyFileW(BuiltProgramPath().c_str(), m_exePath.c_str(), FALSE);
-    const std::wstring trace = JoinPath(folder, L"mrvtrace.dll");
     if (options.traceLibrary != TraceLibrary::kNone) {
-        const wchar_t* built = options.traceLibrary == TraceLibrary::kBoth
-                                   ? L"mrvtrace.dll"
-                                   : L"rawonly\\mrvtrace.dll";
-        CopyFileW(FakePath(built).c_str(), trace.c_str(), FALSE);
+        CopyFileW(FakePath(L"mrvtrace.dll").c_str(), JoinPath(folder, L"mrvtrace.dll").c_str(),
+                  FALSE);
     }
     if (options.withSuiteLibrary) {
         CopyFileW(FakePath(L"qmusredt.dll").c_str(), JoinPath(folder, L"qmusredt.dll").c_str(),

@@ -47,9 +47,8 @@ RunResult RunDebuggee(const std::wstring& commandLine, const std::wstring& worki
                       DWORD timeoutMs, const DebuggeeHooks& hooks = {});
 
 enum class TraceLibrary {
-    kBoth,     // exports both entry points
-    kRawOnly,  // exports only "MRVTRACERAWA"
-    kNone,     // no trace library beside the program
+    kBoth,  // exports both entry points
+    kNone,  // no trace library beside the program
 };
 
 struct ProgramOptions {

@@ -47,17 +47,6 @@ bool RegPutDword(HKEY root, const std::wstring& key, const wchar_t* name, DWORD 
     return PutValue(root, key, name, REG_DWORD, &value, sizeof(value), view);
 }
 
-bool RegPutMultiString(HKEY root, const std::wstring& key, const wchar_t* name,
-                       const std::vector<std::wstring>& values, REGSAM view) {
-    std::wstring block;
-    for (const std::wstring& value : values) {
-        block += value + L'\0';
-    }
-    block += L'\0';
-    return PutValue(root, key, name, REG_MULTI_SZ, block.data(), block.size() * sizeof(wchar_t),
-                    view);
-}
-
 bool RegMakeKey(HKEY root, const std::wstring& key, REGSAM view) {
     return Open(root, key, KEY_WRITE | view, true).valid();
 }

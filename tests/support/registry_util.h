@@ -12,8 +12,6 @@ bool RegPutString(HKEY root, const std::wstring& key, const wchar_t* name,
                   const std::wstring& value, REGSAM view = 0, DWORD type = REG_SZ);
 bool RegPutDword(HKEY root, const std::wstring& key, const wchar_t* name, DWORD value,
                  REGSAM view = 0);
-bool RegPutMultiString(HKEY root, const std::wstring& key, const wchar_t* name,
-                       const std::vector<std::wstring>& values, REGSAM view = 0);
 bool RegMakeKey(HKEY root, const std::wstring& key, REGSAM view = 0);
 bool RegHasKey(HKEY root, const std::wstring& key, REGSAM view = 0);
 bool RegHasValue(HKEY root, const std::wstring& key, const wchar_t* name, REGSAM view = 0);

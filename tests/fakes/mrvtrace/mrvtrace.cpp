@@ -38,11 +38,9 @@ void __cdecl MRVTRACERAWA(DWORD level, const char* moduleTag, DWORD /*reserved*/
     Record("RAWA", level, moduleTag, text);
 }
 
-#ifndef QM_FAKE_TRACE_RAW_ONLY
 void __cdecl MRVTRACERAWA_RESIDENT(DWORD level, const char* moduleTag, DWORD /*reserved*/,
                                    const char* text) {
     Record("RESIDENT", level, moduleTag, text);
 }
-#endif
 
 }  // extern "C"
