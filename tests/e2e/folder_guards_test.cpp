@@ -17,8 +17,8 @@ protected:
     // Every file the Notes and Sametime keywords copy, delete, edit or
     // schedule, as they would find it with folder as each product's folder.
     void PlantLayouts(const std::wstring& folder, bool featureListed) {
-        Put(JoinPath(folder, L"qmnires.dll"), "planted");  // a Notes plug-in file
-        Put(JoinPath(folder, L"x_upd_temp"), "planted");   // an update leftover
+        Put(JoinPath(folder, L"qmnires.dll"), "planted");     // a Notes plug-in file
+        Put(JoinPath(folder, L"x_upd_temp.exe"), "planted");  // an update leftover
         for (const wchar_t* native : {L"", L"rcp", L"native"}) {
             Put(JoinPath(JoinPath(folder, native), kNativeLibrary), "planted");
         }
