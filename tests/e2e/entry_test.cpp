@@ -25,9 +25,7 @@ protected:
         }
         return texts;
     }
-    std::vector<std::string> Texts(const std::wstring& arguments) {
-        return Texts(m_program.Run(arguments));
-    }
+    std::vector<std::string> Texts(const std::wstring& line) { return Texts(m_program.Run(line)); }
 
     ScratchDir m_scratch{L"entry"};
     ProgramUnderTest m_program{m_scratch.Sub(L"bin")};
@@ -92,51 +90,11 @@ TEST_F(EntryTest, RecordsAreCutInto2047CharacterPieces) {
     }
 }
 
-TEST(EntryTraceLibrary, WithoutItEachPieceGoesToTheDebuggerOutput) {
-    ScratchDir scratch(L"none");  // and no suite library: nobody notices
-    const std::wstring line = L"-" + std::wstring(3000, L'k');  // a record of two pieces
-    RunResult run = ProgramUnderTest(scratch.path(), {TraceLibrary::kNone, false}).Run(line);
-    EXPECT_EQ(0, run.exitCode);
-    const std::string record = "NIHandle lpCmdLine=" + Narrow(line) + ",\n";
-    const std::vector<std::string> expected = {"Trace lib invalid\n", record.substr(0, 2047),
-                                               "Trace lib invalid\n", record.substr(2047)};
-    EXPECT_NE(run.debugOutput.end(), std::search(run.debugOutput.begin(), run.debugOutput.end(),
-                                                 expected.begin(), expected.end()));
-    // One more load attempt at the first record, none later.
-    EXPECT_EQ(
-        2, std::count_if(run.debugOutput.begin(), run.debugOutput.end(),
-                         [](const std::string& s) { return s.rfind("InitMRVTRACER:", 0) == 0; }));
-}
-
 TEST_F(EntryTest, FaultInTheTraceLibraryDropsTheRecordAndTheJobGoesOn) {
     m_program.SetEnv(L"QM_FAKE_TRACE_FAULT", L"lpCmdLine=-deleteregfeaturecontrol");
     RunResult run = m_program.Run(L"-deleteregfeaturecontrol");
     EXPECT_EQ(std::vector<std::string>{kDeleteRegStart}, Texts(run));
     EXPECT_TRUE(run.HasDebugOutput("caught AV as expected."));
-}
-
-TEST_F(EntryTest, HostileCommandLinesEndCleanly) {
-    // CreateProcess takes at most 32,767 characters with the terminator.
-    const std::wstring program = L"\"" + m_program.exePath() + L"\" ";
-    const std::wstring join = L"<CmdLine><Action>JoinMeeting</Action><URL>";
-    std::wstring open, close;
-    for (int i = 0; i < 4000; ++i) {
-        open += L"<a>";
-        close += L"</a>";
-    }
-    for (const std::wstring& arguments : {
-             L"-" + std::wstring(32766 - program.size() - 1, L'z'),
-             join + std::wstring(32766 - program.size() - join.size() - 16, L'u') +
-                 L"</URL></CmdLine>",
-             L"<CmdLine><Action>JoinMeeting</Action><X>" + open + close + L"</X></CmdLine>",
-             L"<CmdLine>" + std::wstring(20000, L'<'),
-             std::wstring(L"<CmdLine><Action>JoinMeeting</Action><URL>\u00e9\U0001F600</URL>"),
-             std::wstring(L"-\u00e9\U0001F600"),
-         }) {
-        RunResult run = m_program.RunRaw(program + arguments);
-        EXPECT_FALSE(run.crashed || run.timedOut) << arguments.size();
-        EXPECT_EQ(0, run.exitCode) << arguments.size();
-    }
 }
 
 }  // namespace

@@ -60,7 +60,7 @@ TEST_F(SametimeFilesE2E, Sametime8AndEmbeddedLayoutsAreFilledAndCleared) {
         EXPECT_EQ("running", loaded.Read());
     }
     for (const std::wstring& path :
-         {In(m_sametime, L"rcp", kNativeLibrary), In(m_sametime, L"rcp", kRuntimeC),
+         {In(m_sametime, L"rcp", kNativeLibrary), In(m_sametime, L"rcp", L"msvcr120.dll"),
           In(m_sametime, L"rcp", L"msvcp120.dll"), In(m_sametime, kST8Plugins, kJar),
           In(m_sametime, kST8Features, kFeatureXml),
           // Embedded: the library into the Notes program folder, the rest into the data folder.
@@ -75,7 +75,7 @@ TEST_F(SametimeFilesE2E, Sametime8AndEmbeddedLayoutsAreFilledAndCleared) {
     // Only what the suite alone put there goes: the runtime is shared and stays,
     // and so does the library set aside (it goes at the next restart).
     EXPECT_EQ(3u, ListDir(JoinPath(m_sametime, L"rcp")).size());
-    ExpectFromSuite(In(m_sametime, L"rcp", kRuntimeC));
+    ExpectFromSuite(In(m_sametime, L"rcp", L"msvcr120.dll"));
     EXPECT_EQ(std::vector<std::wstring>{L"other.jar"}, ListDir(JoinPath(m_sametime, kST8Plugins)));
     EXPECT_EQ((std::vector<std::wstring>{L"Data", L"native"}), ListDir(m_notes));
     for (const std::wstring& folder :
@@ -84,47 +84,31 @@ TEST_F(SametimeFilesE2E, Sametime8AndEmbeddedLayoutsAreFilledAndCleared) {
         EXPECT_EQ(std::vector<std::wstring>{}, ListDir(folder)) << Narrow(folder);
     }
     EXPECT_EQ(L"%SystemRoot%\\system32", MachinePath());
-}
-
-TEST_F(SametimeFilesE2E, Sametime7LayoutAndAStopAtItsLockedLibrary) {
-    InstallSuite();
-    DeleteFileW(JoinPath(m_suite, kRuntimeC).c_str());
-    InstallSametime(0);  // no version: Sametime 7
-    for (const wchar_t* folder : {L"native", L"plugins", L"features"}) {
-        ASSERT_TRUE(MakeDirs(JoinPath(m_sametime, folder)));
-    }
-    EXPECT_EQ(0, Program().Run(L"-copyfilestosametime").exitCode);
-    // The C runtime comes first; without it the C++ runtime is not tried.
-    EXPECT_EQ(std::vector<std::wstring>{kNativeLibrary}, ListDir(JoinPath(m_sametime, L"native")));
-    ExpectFromSuite(In(m_sametime, L"plugins", kJar));
-    ExpectFromSuite(In(m_sametime, L"features", kFeatureXml));
-
-    HeldOpen locked(In(m_sametime, L"native", kNativeLibrary), FILE_SHARE_READ);
-    ASSERT_TRUE(locked.ok());
-    SetMachinePath(m_suite);
-    RunResult run = Program().Run(L"-delsametimefilesEx");
-    EXPECT_EQ(0, run.exitCode);
-    EXPECT_TRUE(run.HasTrace(" CQMCommon::RemoveSametimePluginFiles: DeleteFile Failed!\n,\n"));
-    EXPECT_TRUE(FileExists(In(m_sametime, L"plugins", kJar)));
     // The suite folder as the only entry stays: an empty machine Path is never written.
+    SetMachinePath(m_suite);
+    RunResult run = Program().Run(L"-delsametimefiles");
     EXPECT_EQ(m_suite, RegGetString(HKEY_LOCAL_MACHINE, kEnvironmentKey, L"Path").value_or(L""));
     EXPECT_TRUE(run.HasTraceContaining("the Path would be empty, left as it is"));
 }
 
-TEST_F(SametimeFilesE2E, CopyNeverWritesForAFailedLookup) {
+TEST_F(SametimeFilesE2E, EmbeddedCopyNeedsNoNotesProgramFolderNorWritesForAFailedLookup) {
     // Sametime without a folder, Notes 8 without a program folder: the
     // lookups hand over empty folders, which must not become the drive root.
+    // The data folder's files are placed all the same.
     InstallSuite();
     InstallSametime(8, L"");
     ASSERT_TRUE(RegPutString(HKEY_LOCAL_MACHINE, kNotes8Key, L"DataPath", m_data));
+    ASSERT_TRUE(MakeDirs(JoinPath(m_data, kDataPlugins)));
+    ASSERT_TRUE(MakeDirs(JoinPath(m_data, kDataFeatures)));
     EXPECT_EQ(0, Program().Run(L"-copyfilestosametime").exitCode);
-    for (const wchar_t* path : {L"C:\\qmmrvjni.dll", L"C:\\rcp", L"C:\\shared", L"C:\\workspace"}) {
+    for (const wchar_t* path : {L"C:\\qmmrvjni.dll", L"C:\\rcp", L"C:\\shared"}) {
         EXPECT_FALSE(FileExists(path) || DirExists(path)) << Narrow(path);
     }
-    EXPECT_EQ(std::vector<std::wstring>{}, ListDir(m_data));
+    ExpectFromSuite(In(m_data, kDataPlugins, kJar));
+    ExpectFromSuite(In(m_data, kDataFeatures, kFeatureXml));
 }
 
-TEST_F(SametimeFilesE2E, RestartRemovalStampsAndThePerUserCopy) {
+TEST_F(SametimeFilesE2E, RestartRemovalAndStamps) {
     InstallSuite();
     InstallSametime(8);
     InstallNotes8();
@@ -141,24 +125,15 @@ TEST_F(SametimeFilesE2E, RestartRemovalStampsAndThePerUserCopy) {
     }
     EXPECT_EQ(pending + 8, PendingDeleteCount());
 
-    // The stamps of both configurations are renamed, an older backup replaced.
-    const std::wstring stConfig = JoinPath(m_sametime, L"configuration\\org.eclipse.update");
-    const std::wstring dataConfig = JoinPath(m_data, L"configuration\\org.eclipse.update");
-    Put(JoinPath(stConfig, L"last.config.stamp"), "st-new");
-    Put(JoinPath(stConfig, L"last.config.stamp.bak"), "st-old");
-    Put(JoinPath(dataConfig, L"last.config.stamp"), "data-new");
+    // The stamps of both configurations are renamed.
+    for (const std::wstring& base : {m_sametime, m_data}) {
+        Put(JoinPath(base, L"configuration\\org.eclipse.update\\last.config.stamp"), "stamp");
+    }
     EXPECT_EQ(0, Program().Run(L"-delsametimestampfile").exitCode);
-    EXPECT_EQ(std::vector<std::wstring>{L"last.config.stamp.bak"}, ListDir(stConfig));
-    EXPECT_EQ("st-new", ReadFileBytes(JoinPath(stConfig, L"last.config.stamp.bak")));
-    EXPECT_EQ("data-new", ReadFileBytes(JoinPath(dataConfig, L"last.config.stamp.bak")));
-
-    // The per-user install: the data folder's feature files only.
-    ASSERT_TRUE(MakeDirs(JoinPath(m_data, kDataPlugins)));
-    ASSERT_TRUE(MakeDirs(JoinPath(m_data, kDataFeatures)));
-    EXPECT_EQ(0, Program().Run(L"-smsinstallsametimeex").exitCode);
-    ExpectFromSuite(In(m_data, kDataPlugins, kJar));
-    ExpectFromSuite(dataFeature);
-    EXPECT_FALSE(FileExists(JoinPath(m_notes, kNativeLibrary)));
+    for (const std::wstring& base : {m_sametime, m_data}) {
+        EXPECT_EQ(std::vector<std::wstring>{L"last.config.stamp.bak"},
+                  ListDir(JoinPath(base, L"configuration\\org.eclipse.update")));
+    }
 }
 
 }  // namespace

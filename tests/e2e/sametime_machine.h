@@ -11,7 +11,6 @@ namespace sametime_test {
 
 const wchar_t kNotes8Key[] = L"SOFTWARE\\Lotus\\Notes\\8.0";
 const wchar_t kNativeLibrary[] = L"qmmrvjni.dll";
-const wchar_t kRuntimeC[] = L"msvcr120.dll";
 const wchar_t kJar[] = L"com.mrv.realtime.meeting_1.0.1.jar";
 const wchar_t kFeatureXml[] = L"com.mrv.realtime.meeting.feature_1.0.1\\feature.xml";
 const char kFeatureId[] = "id=\"com.mrv.realtime.meeting.feature\"";
@@ -33,20 +32,12 @@ inline std::string PlatformXml(const std::string& siteUrl, const std::string& fe
            features + "</site>\n</config>\n";
 }
 
-inline size_t CountOf(const std::string& text, const std::string& part) {
-    size_t count = 0;
-    for (size_t at = text.find(part); at != std::string::npos; at = text.find(part, at + 1)) {
-        ++count;
-    }
-    return count;
-}
-
 class SametimeMachine : public MachineTest {
 protected:
     // The suite folder with the feature's files, each holding "suite:<name>".
     void InstallSuite() {
         for (const wchar_t* name :
-             {kNativeLibrary, kRuntimeC, L"msvcp120.dll", kJar, L"feature.xml"}) {
+             {kNativeLibrary, L"msvcr120.dll", L"msvcp120.dll", kJar, L"feature.xml"}) {
             Put(JoinPath(m_suite, name), "suite:" + Narrow(name));
         }
         ASSERT_TRUE(
