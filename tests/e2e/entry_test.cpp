@@ -1,6 +1,5 @@
 // The program as installers start it: mode selection, the trace records it
-// writes (byte for byte) and where they go, the suite library it holds, and
-// hostile command lines.
+// writes (byte for byte) and where they go, and the suite library it holds.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -58,7 +57,6 @@ TEST_F(EntryTest, CommandLinesChooseTheirMode) {
         {L"x/DeleteRegFEATURECONTROL", {entry + "x/DeleteRegFEATURECONTROL,\n", kDeleteRegStart}},
         {L"deleteregfeaturecontrol", {entry + "deleteregfeaturecontrol,\n"}},
         {L"-deleteregfeaturecontrol ", {entry + "-deleteregfeaturecontrol ,\n"}},
-        {L"- deleteregfeaturecontrol", {entry + "- deleteregfeaturecontrol,\n"}},
         {L"", {entry + ",\n"}},
         // An Action command starts at "<CmdLine>"; its names are case-sensitive.
         {L"xyz <CmdLine><Action>openhelp</Action></CmdLine>",
@@ -88,6 +86,21 @@ TEST_F(EntryTest, RecordsAreCutInto2047CharacterPieces) {
         EXPECT_EQ(pieces, sizes);
         EXPECT_EQ("NIHandle lpCmdLine=" + Narrow(line) + ",\n", joined);
     }
+}
+
+TEST(EntryTraceLibrary, WithoutItEachPieceGoesToTheDebuggerOutput) {
+    ScratchDir scratch(L"none");
+    const std::wstring line = L"-" + std::wstring(3000, L'k');  // a record of two pieces
+    RunResult run = ProgramUnderTest(scratch.path(), {TraceLibrary::kNone, false}).Run(line);
+    const std::string record = "NIHandle lpCmdLine=" + Narrow(line) + ",\n";
+    const std::vector<std::string> expected = {"Trace lib invalid\n", record.substr(0, 2047),
+                                               "Trace lib invalid\n", record.substr(2047)};
+    EXPECT_NE(run.debugOutput.end(), std::search(run.debugOutput.begin(), run.debugOutput.end(),
+                                                 expected.begin(), expected.end()));
+    // One more load attempt at the first record, none later.
+    EXPECT_EQ(
+        2, std::count_if(run.debugOutput.begin(), run.debugOutput.end(),
+                         [](const std::string& s) { return s.rfind("InitMRVTRACER:", 0) == 0; }));
 }
 
 TEST_F(EntryTest, FaultInTheTraceLibraryDropsTheRecordAndTheJobGoesOn) {

@@ -227,6 +227,7 @@ public:
         ASSERT_EQ(0, Msiexec(std::wstring(L"/x ") + kProductCode));
         EXPECT_EQ(kUninstallRoad, CommandLines());
     }
+    std::string Trace() const { return ReadFileBytes(m_trace); }
     // The command line of each run of the program, in order.
     std::vector<std::string> CommandLines() const {
         const std::string kEntry = "NIHandle lpCmdLine=";
@@ -238,9 +239,6 @@ public:
             }
         }
         return lines;
-    }
-    bool Logged(const std::string& message) const {
-        return ReadFileBytes(m_trace).find(message) != std::string::npos;
     }
 
     // A file a bad road holds open, as a running Notes client does.
@@ -330,7 +328,7 @@ const BadRoad kBadRoads[] = {
          EXPECT_EQ(PlatformXml("file:../shared/eclipse/"), ReadFileBytes(config));
          EXPECT_EQ(DWORD(FILE_ATTRIBUTE_READONLY),
                    GetFileAttributesW(config.c_str()) & FILE_ATTRIBUTE_READONLY);
-         EXPECT_TRUE(road.Logged("UpdateSametime8Config: Save config file failed!"));
+         EXPECT_EQ(1, CountOf(road.Trace(), "UpdateSametime8Config: Save config file failed!"));
      },
      {}},
     {"SuiteFolderDeletedByHand",

@@ -25,15 +25,6 @@ const char kFailureBox[] =
     "QclMessageBox owner=0 style=0x42030 text=No mail could be started. Please send the trace "
     "files by hand. caption=Quillmark Tools";
 
-// How often part occurs in text.
-int Count(const std::string& text, const std::string& part) {
-    int count = 0;
-    for (size_t at = text.find(part); at != std::string::npos; at = text.find(part, at + 1)) {
-        ++count;
-    }
-    return count;
-}
-
 class ProblemReportTest : public MachineTest {
 protected:
     ProblemReportTest() {
@@ -114,7 +105,7 @@ TEST_F(ProblemReportTest, TraceFilesAreZippedAndMailedAsOneAttachment) {
                            "recipients=0 originator=none\n" +
                            std::string(kAttachment) + "Mirovan_Trace.zip opens=1 path="))
         << Calls();
-    EXPECT_EQ(1, Count(Calls(), kAttachment));
+    EXPECT_EQ(1, CountOf(Calls(), kAttachment));
     EXPECT_TRUE((std::map<std::string, std::string>{{"a.mvt", a}, {"b.mvt", b}}) == Unzipped());
 }
 
@@ -155,9 +146,9 @@ TEST_F(ProblemReportTest, MailGoesOutWithoutZipOrTheUserIsTold) {
     for (const wchar_t* mapiResult : {L"1", L"2"}) {
         Program().SetEnv(L"QM_FAKE_MAPI_RESULT", mapiResult);
         Report();
-        EXPECT_EQ(1, Count(Calls(), kAttachment));
-        EXPECT_EQ(1, Count(Calls(), std::string(kAttachment) + "a.mvt opens=1 path="));
-        EXPECT_EQ(mapiResult[0] == L'2' ? 1 : 0, Count(Calls(), kFailureBox)) << Calls();
+        EXPECT_EQ(1, CountOf(Calls(), kAttachment));
+        EXPECT_EQ(1, CountOf(Calls(), std::string(kAttachment) + "a.mvt opens=1 path="));
+        EXPECT_EQ(mapiResult[0] == L'2' ? 1 : 0, CountOf(Calls(), kFailureBox)) << Calls();
     }
     CloseHandle(held);
 }
@@ -170,7 +161,7 @@ TEST_F(ProblemReportTest, RunningOutlookGetsTheMailOnItsCommandLineOrTheUserIsTo
     }
     PutTrace(L"a.mvt", 1000);
     Report();  // Outlook cannot be started: not registered
-    EXPECT_EQ(1, Count(Calls(), kFailureBox)) << Calls();
+    EXPECT_EQ(1, CountOf(Calls(), kFailureBox)) << Calls();
 
     RegPutString(HKEY_LOCAL_MACHINE, kAppPathsKey, L"", FakePath(L"OUTLOOK.EXE"));
     Report();
@@ -182,7 +173,7 @@ TEST_F(ProblemReportTest, RunningOutlookGetsTheMailOnItsCommandLineOrTheUserIsTo
     for (int i = 0; i < 100 && Calls().find("OUTLOOK.EXE") == std::string::npos; ++i) {
         Sleep(100);
     }
-    EXPECT_EQ(1, Count(Calls(), outlook)) << Calls();
+    EXPECT_EQ(1, CountOf(Calls(), outlook)) << Calls();
     EXPECT_EQ(std::string::npos, Calls().find("MAPISendMail"));
 }
 
@@ -208,9 +199,9 @@ TEST_F(PostingTest, LogUrlGetsModuleAndErrorAndIsRequestedInSlotOrder) {
         DWORD start = GetTickCount();
         Run(post + row.logUrl + L"</CmdLine>");
         EXPECT_LT(GetTickCount() - start, 8000u);
-        EXPECT_EQ(1, Count(Calls(), "\nURL slot4 1\nURL slot6 10\nURL slot11 url=" + row.url +
-                                        " data=(null) 0 0\nURL completed by a message of the "
-                                        "caller's thread\nURL slot12\nURL released\n"))
+        EXPECT_EQ(1, CountOf(Calls(), "\nURL slot4 1\nURL slot6 10\nURL slot11 url=" + row.url +
+                                          " data=(null) 0 0\nURL completed by a message of the "
+                                          "caller's thread\nURL slot12\nURL released\n"))
             << Calls();
     }
 }
@@ -222,7 +213,7 @@ TEST_F(PostingTest, PostAttendeeGetsTheRawCommandLine) {
         L"lead text <CmdLine><Action>PostAttendee</Action><AttendeeFile>C:\\a b.xml"
         L"</AttendeeFile></CmdLine>";
     Run(arguments);
-    EXPECT_EQ(1, Count(Calls(), "\nPostAttendee " + Narrow(arguments) + "\n")) << Calls();
+    EXPECT_EQ(1, CountOf(Calls(), "\nPostAttendee " + Narrow(arguments) + "\n")) << Calls();
     DeleteFileW(JoinPath(Program().folder(), L"qmONIUI.dll").c_str());
     EXPECT_TRUE(Run(arguments).HasTrace(" Load Lib failed or GetProcAddress failed.\n,\n"));
 }

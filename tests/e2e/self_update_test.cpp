@@ -14,15 +14,6 @@ const wchar_t kNotes8Key[] = L"SOFTWARE\\Lotus\\Notes\\8.0";
 const wchar_t kNIKey[] = L"SOFTWARE\\mirovan\\NI";
 const wchar_t kSiteKey[] = L"Software\\Mirovan_Notes\\General";
 
-// How many times part occurs in text.
-int Count(const std::string& text, const std::string& part) {
-    int count = 0;
-    for (size_t at = text.find(part); at != std::string::npos; at = text.find(part, at + 1)) {
-        ++count;
-    }
-    return count;
-}
-
 class SelfUpdate : public MachineTest {
 protected:
     SelfUpdate() {
@@ -98,17 +89,29 @@ TEST_F(SelfUpdate, TemporaryCopyCommitsOrRollsBackAndHandsOverToTheInstalledProg
         EXPECT_EQ(c.exitCode, run.exitCode);
         // The updater's start: the window's handle, the site name, the Notes folder.
         EXPECT_EQ(c.updater ? 1 : 0,
-                  Count(m_calls, "~TmpDown.exe started: -downstart -hParentWnd="));
+                  CountOf(m_calls, "~TmpDown.exe started: -downstart -hParentWnd="));
         EXPECT_EQ(c.updater != nullptr,
                   m_calls.find(" -sitename=" + Narrow(c.siteName ? c.siteName : L"") + " | " +
                                Narrow(m_notes) + "\n") != std::string::npos);
         EXPECT_EQ(c.configRuns,
-                  Count(m_calls, "qmnwcfg.exe started: -update | " + Narrow(m_notes)));
-        EXPECT_EQ(c.updaterGot ? 1 : 0, Count(m_calls, std::string("~TmpDown.exe received: ") +
-                                                           (c.updaterGot ? c.updaterGot : "")));
+                  CountOf(m_calls, "qmnwcfg.exe started: -update | " + Narrow(m_notes)));
+        EXPECT_EQ(c.updaterGot ? 1 : 0, CountOf(m_calls, std::string("~TmpDown.exe received: ") +
+                                                             (c.updaterGot ? c.updaterGot : "")));
         const std::string final = c.finalCommand ? std::string(c.finalCommand) + " |" : "";
-        EXPECT_EQ(c.finalCommand ? 1 : 0, Count(m_calls, "qmMrvONI.exe started: " + final));
+        EXPECT_EQ(c.finalCommand ? 1 : 0, CountOf(m_calls, "qmMrvONI.exe started: " + final));
     }
+}
+
+// The program under its own name cannot start its copy (a plug-in folder
+// longer than a path): neither success, nor a write in the current folder.
+TEST_F(SelfUpdate, InstalledProgramThatCannotStartItsCopyFailsAtOnce) {
+    RegPutString(HKEY_LOCAL_MACHINE, kNIKey, L"Path", m_plugin + L"\\" + std::wstring(300, L'n'));
+    Program().Run(L"-nosuchkeyword");  // leaves its logs, as the next run does
+    const std::vector<std::wstring> before = ListDir(Program().folder());
+    RunResult run = Run(Program(), L"post-wait");
+    EXPECT_EQ(-1, run.exitCode);
+    EXPECT_TRUE(run.HasTrace(" \nLaunching ~MrvONI.exe process failed.\n,\n"));
+    EXPECT_EQ(before, ListDir(Program().folder()));
 }
 
 TEST_F(SelfUpdate, CommittedUpdateEndsWithTheCopiesGoneAndNotesCompleted) {
@@ -121,7 +124,7 @@ TEST_F(SelfUpdate, CommittedUpdateEndsWithTheCopiesGoneAndNotesCompleted) {
     }
     WriteFileBytes(JoinPath(m_notes, L"qmnires.dll"), "notes' own");
     EXPECT_EQ(0, Run(installed, L"post-wait").exitCode);
-    EXPECT_EQ(1, Count(m_calls, "~TmpDown.exe received: commit"));
+    EXPECT_EQ(1, CountOf(m_calls, "~TmpDown.exe received: commit"));
     // The final run removed the copies and completed the Notes folder.
     EXPECT_FALSE(FileExists(JoinPath(m_plugin, L"~TmpDown.exe")) ||
                  FileExists(JoinPath(m_plugin, L"~MrvONI.exe")));
@@ -138,8 +141,8 @@ TEST_F(SelfUpdateSlow, UpdaterThatNeverEndsIsTerminatedAfterThirtySeconds) {
     EXPECT_TRUE(AwaitProcessesNamed(L"~TmpDown.exe", 5000));
     EXPECT_GE(elapsed, 29000u);
     EXPECT_LT(elapsed, 60000u);
-    EXPECT_EQ(1, Count(m_calls, "~TmpDown.exe received: commit"));
-    EXPECT_EQ(1, Count(m_calls, "qmMrvONI.exe started: -nendupdate |"));
+    EXPECT_EQ(1, CountOf(m_calls, "~TmpDown.exe received: commit"));
+    EXPECT_EQ(1, CountOf(m_calls, "qmMrvONI.exe started: -nendupdate |"));
 }
 
 }  // namespace

@@ -11,6 +11,8 @@ bool MakeDirs(const std::wstring& path);
 // Writes bytes, creating missing parent folders.
 bool WriteFileBytes(const std::wstring& path, const std::string& bytes);
 std::string ReadFileBytes(const std::wstring& path);
+// How many times part occurs in text.
+int CountOf(const std::string& text, const std::string& part);
 // Removes a file or a whole folder tree (read-only entries included).
 void RemoveTree(const std::wstring& path);
 // Names of the entries of a folder, without "." and "..", sorted.

@@ -9,7 +9,6 @@
 #include "actions/rpt_stream.h"
 #include "tests/support/file_util.h"
 #include "tests/support/scratch_dir.h"
-#include "tests/support/trace_capture.h"
 
 namespace {
 
@@ -22,19 +21,28 @@ BOOL LookUpAccount(const wchar_t* processName, CStringEx& accountName) {
 }
 
 TEST(ProblemReportAccounts, OutlookAndOneClickUnderDifferentAccountsStopTheReport) {
+    // The trace stand-in beside this test writes to the file this variable names.
+    ScratchDir scratch(L"trace");
+    const std::wstring log = scratch.Sub(L"trace.log");
+    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", log.c_str());
     for (const wchar_t* oneClick : {L"Bob", L"ALICE"}) {
         g_oneClickUser = oneClick;
         const bool stops = oneClick[0] == L'B';
-        TraceCapture traces;
+        DeleteFileW(log.c_str());
         CSendProblemReport(&LookUpAccount).Send();
-        EXPECT_EQ(stops, traces.Has(" CSendProblemReport::Send Outlook.exe and qmoneclk.exe are "
-                                    "running at different user level\n,(LPCTSTR)"
-                                    "strQMOneClkUserName=" +
-                                    Narrow(oneClick) + ",(LPCTSTR)strOutlookUserName=alice,\n"));
+        const std::string traces = ReadFileBytes(log);
+        EXPECT_EQ(stops,
+                  CountOf(traces,
+                          " CSendProblemReport::Send Outlook.exe and qmoneclk.exe are "
+                          "running at different user level\n,(LPCTSTR)"
+                          "strQMOneClkUserName=" +
+                              Narrow(oneClick) + ",(LPCTSTR)strOutlookUserName=alice,\n") == 1);
         // Going on, the report looks for its resource library next.
-        EXPECT_EQ(!stops, traces.Has(" COneClickItemHandler::SendReportProblem() load qmocres.dll "
-                                     "failed!\n,\n"));
+        EXPECT_EQ(!stops, CountOf(traces,
+                                  " COneClickItemHandler::SendReportProblem() load "
+                                  "qmocres.dll failed!\n,\n") == 1);
     }
+    SetEnvironmentVariableW(L"QM_FAKE_TRACE_LOG", nullptr);
 }
 
 // The size was measured before the read: a file that shrank since fails, one
