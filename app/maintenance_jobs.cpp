@@ -2,6 +2,7 @@
 
 #include <windows.h>
 
+#include "base/suite_key.h"
 #include "base/trace.h"
 #include "cleanup/installer_registration.h"
 #include "cleanup/legacy_removal.h"
@@ -415,7 +416,7 @@ int JobAddShortcuts() {
 int JobDelUnusedData() {
     LogJobMessage("qmmirovanoni.exe: Call delshortcuts and ClearAllCurUserqmreg.");
     UnInstallShortcuts();
-    DeleteAllCurUserReg(L"SOFTWARE\\Mirovan\\QmkTools", nullptr, nullptr);
+    DeleteAllCurUserReg(kSuiteKey, nullptr, nullptr);
     return 0;
 }
 

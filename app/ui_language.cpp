@@ -1,6 +1,7 @@
 #include "app/ui_language.h"
 
 #include "base/registry.h"
+#include "base/suite_key.h"
 #include "base/win_handles.h"
 #include "cleanup/suite_products.h"
 
@@ -24,7 +25,6 @@ const LanguageRow kLanguages[] = {
 };
 const size_t kCodeRows = 16;
 
-const wchar_t kSuiteKey[] = L"SOFTWARE\\Mirovan\\QmkTools";
 const wchar_t kLanguageValue[] = L"QMUILanguage";
 
 void UpperAndTrim(CStringEx& code) {

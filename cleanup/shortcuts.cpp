@@ -9,6 +9,7 @@
 #include "base/os_version.h"
 #include "base/proc_address.h"
 #include "base/registry.h"
+#include "base/suite_key.h"
 #include "base/trace.h"
 #include "cleanup/companion_app.h"
 #include "cleanup/link_folder.h"
@@ -18,7 +19,6 @@
 
 namespace {
 
-const wchar_t kSuiteKey[] = L"SOFTWARE\\Mirovan\\QmkTools";
 const wchar_t kOneClickExe[] = L"qmoneclk.exe";
 const wchar_t kInstallerExe[] = L"qminst.exe";
 const wchar_t kResLibrary[] = L"qmRes.dll";

@@ -1,12 +1,12 @@
 // The suite's own install folder, as the Notes and Sametime code finds it.
 #include "notes/product_locations.h"
 
+#include "base/suite_key.h"
 #include "base/trace.h"
 #include "notes/location_values.h"
 
 namespace {
 
-const wchar_t kSuiteKey[] = L"SOFTWARE\\Mirovan\\QmkTools";
 const wchar_t kSuitePathValue[] = L"Path";
 
 }  // namespace

@@ -4,10 +4,10 @@
 #include "base/os_version.h"
 #include "base/path_api.h"
 #include "base/registry.h"
+#include "base/suite_key.h"
 
 namespace {
 
-const wchar_t kSuiteKey[] = L"SOFTWARE\\Mirovan\\QmkTools";
 const wchar_t kServer32Key[] = L"CLSID\\{A12A21B3-CFDA-497E-98C0-CE60D4D108C8}\\LocalServer32";
 const wchar_t kServer32KeyWow64[] =
     L"Wow6432Node\\CLSID\\{A12A21B3-CFDA-497E-98C0-CE60D4D108C8}\\LocalServer32";

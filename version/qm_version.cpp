@@ -3,12 +3,12 @@
 #include "base/com_owners.h"
 #include "base/ms_dom.h"
 #include "base/registry.h"
+#include "base/suite_key.h"
 #include "base/untrusted_xml_load.h"
 #include "notes/plugin_paths.h"
 
 namespace {
 
-const wchar_t kSuiteKey[] = L"SOFTWARE\\Mirovan\\QmkTools";
 const wchar_t kUninstallKey[] =
     L"Software\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\QuillmarkTools";
 const wchar_t kVersionFile[] = L"QM.xml";
